@@ -1,0 +1,113 @@
+#include "support/interpose.h"
+
+#include <dlfcn.h>
+#include <unistd.h>
+
+#include <cerrno>
+#include <cstdlib>
+
+#define INTERPOSED extern "C" __attribute__((visibility("default")))
+
+namespace testsupport {
+
+void* FindRealFunction(const char* name) {
+  void* function = dlsym(RTLD_NEXT, name);
+  if (function == nullptr) {
+    std::abort();
+  }
+  return function;
+}
+
+namespace calls {
+
+constinit Interposed<int(pthread_t*, const pthread_attr_t*, void* (*)(void*), void*)> pthreadCreate(
+    "pthread_create");
+constinit Interposed<int(pthread_t)> pthreadDetach("pthread_detach");
+constinit Interposed<int(pthread_cond_t*, pthread_mutex_t*, const timespec*)> pthreadCondTimedwait(
+    "pthread_cond_timedwait");
+constinit Interposed<int(char*, std::size_t)> gethostname("gethostname");
+constinit Interposed<int(const char*, hostent*, char*, std::size_t, hostent**, int*)> gethostbynameR(
+    "gethostbyname_r");
+constinit Interposed<hostent*(const char*)> gethostbyname("gethostbyname");
+constinit Interposed<int(const char*, struct stat*)> stat("stat");
+constinit Interposed<int(const char*, const char*)> rename("rename");
+constinit Interposed<int(const char*, mode_t)> chmod("chmod");
+constinit Interposed<int(char*)> mkstemp("mkstemp");
+constinit Interposed<int(int)> fsync("fsync");
+constinit Interposed<void*(const char*, int)> dlopen("dlopen");
+constinit Interposed<int(void*)> dlclose("dlclose");
+constinit Interposed<char*()> dlerror("dlerror");
+
+}  // namespace calls
+}  // namespace testsupport
+
+namespace calls = testsupport::calls;
+
+INTERPOSED int pthread_create(pthread_t* thread, const pthread_attr_t* attributes, void* (*start)(void*),
+                              void* argument) noexcept {
+  return calls::pthreadCreate.Call(thread, attributes, start, argument);
+}
+
+INTERPOSED int pthread_detach(pthread_t thread) noexcept {
+  return calls::pthreadDetach.Call(thread);
+}
+
+INTERPOSED int pthread_cond_timedwait(pthread_cond_t* condition, pthread_mutex_t* mutex,
+                                      const timespec* deadline) {
+  return calls::pthreadCondTimedwait.Call(condition, mutex, deadline);
+}
+
+INTERPOSED int gethostname(char* name, std::size_t length) noexcept {
+  return calls::gethostname.Call(name, length);
+}
+
+INTERPOSED int gethostbyname_r(const char* name, hostent* result, char* buffer, std::size_t length,
+                               hostent** found, int* error) {
+  return calls::gethostbynameR.Call(name, result, buffer, length, found, error);
+}
+
+INTERPOSED hostent* gethostbyname(const char* name) {
+  return calls::gethostbyname.Call(name);
+}
+
+INTERPOSED int stat(const char* path, struct stat* status) noexcept {
+  return calls::stat.Call(path, status);
+}
+
+// On this platform the two are one function under two names.
+INTERPOSED int stat64(const char* path, struct stat64* status) noexcept {
+  static_assert(sizeof(struct stat) == sizeof(struct stat64));
+  return calls::stat.Call(path, reinterpret_cast<struct stat*>(status));
+}
+
+INTERPOSED int rename(const char* from, const char* to) noexcept {
+  return calls::rename.Call(from, to);
+}
+
+INTERPOSED int chmod(const char* path, mode_t mode) noexcept {
+  return calls::chmod.Call(path, mode);
+}
+
+INTERPOSED int mkstemp(char* pattern) {
+  return calls::mkstemp.Call(pattern);
+}
+
+INTERPOSED int mkstemp64(char* pattern) {
+  return calls::mkstemp.Call(pattern);
+}
+
+INTERPOSED int fsync(int descriptor) {
+  return calls::fsync.Call(descriptor);
+}
+
+INTERPOSED void* dlopen(const char* path, int flags) noexcept {
+  return calls::dlopen.Call(path, flags);
+}
+
+INTERPOSED int dlclose(void* handle) noexcept {
+  return calls::dlclose.Call(handle);
+}
+
+INTERPOSED char* dlerror() noexcept {
+  return calls::dlerror.Call();
+}

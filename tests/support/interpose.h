@@ -1,0 +1,95 @@
+/// Functions of libc whose calls a test can watch or answer itself.
+///
+/// The test program defines and exports them, so the calls of the shared library, of plug-ins and of the test
+/// itself all come here. As long as no test takes a call over, it goes to the real function.
+#ifndef SUPPORT_INTERPOSE_H
+#define SUPPORT_INTERPOSE_H
+
+#include <netdb.h>
+#include <pthread.h>
+#include <sys/stat.h>
+#include <sys/types.h>
+
+#include <atomic>
+#include <functional>
+#include <utility>
+
+namespace testsupport {
+
+void* FindRealFunction(const char* name);
+
+/// One interposed function. Usable before main() and from every thread.
+template <class Signature>
+class Interposed;
+
+template <class Result, class... Arguments>
+class Interposed<Result(Arguments...)> {
+ public:
+  using Handler = std::function<Result(Arguments...)>;
+
+  constexpr explicit Interposed(const char* name) : name_(name) {}
+
+  /// The real function.
+  Result Real(Arguments... arguments) {
+    using Function = Result (*)(Arguments...);
+    void* function = real_.load(std::memory_order_acquire);
+    if (function == nullptr) {
+      function = FindRealFunction(name_);
+      real_.store(function, std::memory_order_release);
+    }
+    return reinterpret_cast<Function>(function)(arguments...);
+  }
+
+  /// What the interposed function runs.
+  Result Call(Arguments... arguments) {
+    const Handler* handler = handler_.load(std::memory_order_acquire);
+    return handler != nullptr ? (*handler)(arguments...) : Real(arguments...);
+  }
+
+  void Use(const Handler* handler) { handler_.store(handler, std::memory_order_release); }
+
+ private:
+  const char* name_;
+  std::atomic<void*> real_{nullptr};
+  std::atomic<const Handler*> handler_{nullptr};
+};
+
+/// Takes a function over until the end of the scope. The handler may call Real() of the same function. No
+/// other thread may still be in the function when the scope ends.
+template <class Signature>
+class TakeOver {
+ public:
+  TakeOver(Interposed<Signature>& function, typename Interposed<Signature>::Handler handler)
+      : function_(function), handler_(std::move(handler)) {
+    function_.Use(&handler_);
+  }
+  TakeOver(const TakeOver&) = delete;
+  TakeOver& operator=(const TakeOver&) = delete;
+  ~TakeOver() { function_.Use(nullptr); }
+
+ private:
+  Interposed<Signature>& function_;
+  typename Interposed<Signature>::Handler handler_;
+};
+
+namespace calls {
+
+extern Interposed<int(pthread_t*, const pthread_attr_t*, void* (*)(void*), void*)> pthreadCreate;
+extern Interposed<int(pthread_t)> pthreadDetach;
+extern Interposed<int(pthread_cond_t*, pthread_mutex_t*, const timespec*)> pthreadCondTimedwait;
+extern Interposed<int(char*, std::size_t)> gethostname;
+extern Interposed<int(const char*, hostent*, char*, std::size_t, hostent**, int*)> gethostbynameR;
+extern Interposed<hostent*(const char*)> gethostbyname;
+extern Interposed<int(const char*, struct stat*)> stat;
+extern Interposed<int(const char*, const char*)> rename;
+extern Interposed<int(const char*, mode_t)> chmod;
+extern Interposed<int(char*)> mkstemp;
+extern Interposed<int(int)> fsync;
+extern Interposed<void*(const char*, int)> dlopen;
+extern Interposed<int(void*)> dlclose;
+extern Interposed<char*()> dlerror;
+
+}  // namespace calls
+}  // namespace testsupport
+
+#endif  // SUPPORT_INTERPOSE_H
