@@ -1,0 +1,75 @@
+#include "systemconfiguration/pam_control.h"
+
+#include <optional>
+#include <string_view>
+
+#include "keyword_table.h"
+#include "systemconfiguration/exceptions.h"
+
+namespace SystemConfiguration {
+namespace {
+
+constexpr KeywordTable<PAMControl::Control, 6> keywords = {{{PAMControl::Required, "required"},
+                                                            {PAMControl::Requisite, "requisite"},
+                                                            {PAMControl::Sufficient, "sufficient"},
+                                                            {PAMControl::Optional, "optional"},
+                                                            {PAMControl::Include, "include"},
+                                                            {PAMControl::Substack, "substack"}}};
+
+constexpr std::string_view messagePrefix = "Invalid Control: ";
+
+PAMControl::Control ControlOf(const std::string& text) {
+  if (!text.empty() && text.front() == '[' && text.back() == ']') return PAMControl::Bracketed;
+  if (const std::optional<PAMControl::Control> value = FindValue(keywords, text)) return *value;
+  throw InvalidControlException(MessageForUnknown(messagePrefix, text));
+}
+
+}  // namespace
+
+PAMControl::PAMControl() : value_(Unset) {}
+
+PAMControl::PAMControl(Control value) : value_(value) {}
+
+PAMControl::PAMControl(Control value, const std::string& text) : value_(value), text_(text) {}
+
+PAMControl::PAMControl(const std::string& text) : value_(ControlOf(text)) {
+  if (value_ == Bracketed) text_ = text;
+}
+
+PAMControl& PAMControl::operator=(Control value) {
+  value_ = value;
+  return *this;
+}
+
+PAMControl& PAMControl::operator=(const std::string& text) {
+  const Control value = ControlOf(text);
+  if (value == Bracketed) text_ = text;
+  value_ = value;
+  return *this;
+}
+
+bool PAMControl::operator==(const PAMControl& other) const {
+  return value_ == other.value_ && (value_ != Bracketed || text_ == other.text_);
+}
+
+bool PAMControl::operator==(Control value) const {
+  return value_ == value;
+}
+
+bool PAMControl::operator==(const std::string& text) const {
+  return value_ == Bracketed ? text_ == text : value_ == ControlOf(text);
+}
+
+PAMControl::operator std::string() const {
+  if (value_ == Bracketed) return text_;
+  if (const std::optional<std::string_view> keyword = FindText(keywords, value_)) {
+    return std::string(*keyword);
+  }
+  throw InvalidControlException(MessageWithoutKeyword(messagePrefix, value_));
+}
+
+PAMControl::operator Control() const {
+  return value_;
+}
+
+}  // namespace SystemConfiguration
