@@ -6,7 +6,6 @@
 #include <deque>
 #include <functional>
 #include <memory>
-#include <mutex>
 #include <optional>
 #include <string>
 #include <unordered_map>
@@ -16,11 +15,13 @@
 #include "authentication/exception.h"
 #include "authentication/export.h"
 #include "authentication/store.h"
+#include "authentication/thread_annotations.h"
 
 namespace quenix::authentication {
 
 class ActiveDirectoryProvider;
 class ADCache;
+class Mutex;
 class RequestState;
 
 /// Joins the host to an Active Directory domain, leaves it, and answers questions about it.
@@ -142,8 +143,9 @@ class VELMOR_EXPORT ActiveDirectoryStore : public DirectoryStore {
   /// The state that all stores of the process share. `_lock` guards `_asyncRequests` and is taken before the
   /// lock of a RequestState; the cache has a lock of its own, under which nothing else is called.
   static ADCache& _adCache;
-  static std::unordered_map<std::string, std::shared_ptr<RequestState>>& _asyncRequests;
-  static std::mutex& _lock;
+  static Mutex& _lock;
+  static std::unordered_map<std::string, std::shared_ptr<RequestState>>& _asyncRequests
+      VELMOR_GUARDED_BY(_lock);
 
  private:
   std::int32_t requestTimeoutSeconds_;

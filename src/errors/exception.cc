@@ -22,7 +22,9 @@ Exception::Exception(const std::string& message) : code_(0), message_(message) {
 Exception::Exception(unsigned long code, const std::string& message)
     : code_(code), message_(MessageWithCode(code, message)) {}
 
-const char* Exception::what() const noexcept { return message_.c_str(); }
+const char* Exception::what() const noexcept {
+  return message_.c_str();
+}
 
 VELMOR_DEFINE_EXCEPTION_OPERATIONS(Exception)
 

@@ -2,10 +2,14 @@
 #ifndef ERRORS_EXCEPTION_OPERATIONS_H
 #define ERRORS_EXCEPTION_OPERATIONS_H
 
-#define VELMOR_DEFINE_EXCEPTION_OPERATIONS(Class)          \
-  Class::Class(const Class&) = default;                    \
-  Class::~Class() = default;                               \
-  Class* Class::Clone() const { return new Class(*this); } \
-  void Class::Throw() const { throw Class(*this); }
+#define VELMOR_DEFINE_EXCEPTION_OPERATIONS(Class) \
+  Class::Class(const Class&) = default;           \
+  Class::~Class() = default;                      \
+  Class* Class::Clone() const {                   \
+    return new Class(*this);                      \
+  }                                               \
+  void Class::Throw() const {                     \
+    throw Class(*this);                           \
+  }
 
 #endif  // ERRORS_EXCEPTION_OPERATIONS_H

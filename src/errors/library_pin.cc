@@ -28,11 +28,13 @@ void LibraryPin::ReleaseAtThreadEnd() noexcept {
 }
 
 ThreadEndKey::ThreadEndKey() noexcept {
-  // dlclose() itself is the destructor, since a function of this library would still run when its code goes. Its
-  // result is lost, which the calling conventions allow.
+  // dlclose() itself is the destructor, since a function of this library would still run when its code goes.
+  // Its result is lost, which the calling conventions allow.
   pthread_key_create(&key_, reinterpret_cast<void (*)(void*)>(reinterpret_cast<void (*)()>(&dlclose)));
 }
 
-ThreadEndKey::~ThreadEndKey() { pthread_key_delete(key_); }
+ThreadEndKey::~ThreadEndKey() {
+  pthread_key_delete(key_);
+}
 
 }  // namespace quenix::authentication

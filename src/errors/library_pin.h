@@ -8,8 +8,9 @@ namespace quenix::authentication {
 
 /// A reference to the shared object that holds this code, as dlopen() counts them.
 ///
-/// A thread cannot drop the last such reference while it executes the code itself. So a worker hands its reference
-/// over with ReleaseAtThreadEnd(): the C library drops it when the thread has returned from all of our code.
+/// A thread cannot drop the last such reference while it executes the code itself. So a worker hands its
+/// reference over with ReleaseAtThreadEnd(): the C library drops it when the thread has returned from all of
+/// our code.
 class LibraryPin {
  public:
   /// Takes a reference. Holds none where the code is not in a shared object, or is not known to the loader.

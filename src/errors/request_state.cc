@@ -21,9 +21,13 @@ timespec DeadlineAfter(int seconds) {
 
 }  // namespace
 
-RequestState::RequestState() { pthread_cond_init(&condition_, nullptr); }
+RequestState::RequestState() {
+  pthread_cond_init(&condition_, nullptr);
+}
 
-RequestState::~RequestState() { pthread_cond_destroy(&condition_); }
+RequestState::~RequestState() {
+  pthread_cond_destroy(&condition_);
+}
 
 void RequestState::Done(std::unique_ptr<Exception>&& outcome) {
   const MutexLock lock(mutex_);

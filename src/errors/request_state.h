@@ -13,8 +13,8 @@ namespace quenix::authentication {
 
 /// The outcome of one provider request: pending at first, then done, with a failure or without.
 ///
-/// Held by a shared pointer, so that it outlives both the worker and those who wait. The request's answer is not
-/// kept here: it is in the cache before the request is done.
+/// Held by a shared pointer, so that it outlives both the worker and those who wait. The request's answer is
+/// not kept here: it is in the cache before the request is done.
 class RequestState {
  public:
   RequestState();
@@ -25,9 +25,10 @@ class RequestState {
   /// Marks the request done and wakes all who wait; null is success. Called once, by the request's worker.
   void Done(std::unique_ptr<Exception>&& outcome);
 
-  /// Waits until the request is done, no longer than `timeoutSeconds` by the wall clock, and throws a copy of its
-  /// failure if it has one. Throws ProviderCallTimedOutException when the time is over, even if the request is
-  /// done at that moment, and ThreadErrorException when waiting fails. Any number of threads may wait.
+  /// Waits until the request is done, no longer than `timeoutSeconds` by the wall clock, and throws a copy of
+  /// its failure if it has one. Throws ProviderCallTimedOutException when the time is over, even if the
+  /// request is done at that moment, and ThreadErrorException when waiting fails. Any number of threads may
+  /// wait.
   void WaitResult(int timeoutSeconds);
 
  private:
