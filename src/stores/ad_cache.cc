@@ -4,6 +4,16 @@
 
 namespace quenix::authentication {
 
+namespace {
+
+bool ContainsAll(const std::vector<std::string>& list, const char* const* names, std::size_t count) {
+  return std::all_of(names, names + count, [&list](const char* name) {
+    return std::find(list.begin(), list.end(), name) != list.end();
+  });
+}
+
+}  // namespace
+
 ActiveDirectoryStoreConfiguration ADCache::GetConfiguration() const {
   const MutexLock lock(lock_);
   ActiveDirectoryStoreConfiguration configuration;
@@ -86,10 +96,7 @@ void ADCache::SetSmartCardEnabledServices(const std::vector<std::string>& servic
 bool ADCache::IsSmartCardAuthenticationEnabled(const char* const* services, std::size_t count) const {
   const MutexLock lock(lock_);
   if (!pcscdSvcPolicyOn_) return false;
-  const auto& enabled = smartCardEnabledServices_;
-  return std::all_of(services, services + count, [&enabled](const char* service) {
-    return std::find(enabled.begin(), enabled.end(), service) != enabled.end();
-  });
+  return ContainsAll(smartCardEnabledServices_, services, count);
 }
 
 void ADCache::SetPcscdSvcPolicyOn(bool on) {
