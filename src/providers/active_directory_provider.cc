@@ -62,14 +62,15 @@ const char* NullWhenEmpty(const std::string& text) {
   return text.empty() ? nullptr : text.c_str();
 }
 
-/// Pointers into `texts` and a null pointer behind them.
+/// The status of a call with an array of pointers into `texts` and a null pointer behind them. The array is
+/// gone before anybody looks at the status.
 template <class Texts>
-std::vector<const char*> NullTerminated(const Texts& texts) {
+std::uint32_t CallWithTexts(ActiveDirectorySetStrings slot, const Texts& texts) {
   std::vector<const char*> pointers;
   pointers.reserve(texts.size() + 1);
   for (const auto& text : texts) pointers.push_back(text.c_str());
   pointers.push_back(nullptr);
-  return pointers;
+  return Implemented(slot)(pointers.data());
 }
 
 }  // namespace
@@ -143,7 +144,7 @@ Domain ActiveDirectoryProvider::GetActiveDomain() const {
 
 void ActiveDirectoryProvider::SetPreferredDomainControllers(
     const std::deque<std::string>& controllers) const {
-  Call(operations_->setPreferredDomainControllers, NullTerminated(controllers).data());
+  ThrowUnlessSuccess(CallWithTexts(operations_->setPreferredDomainControllers, controllers));
 }
 
 std::deque<std::string> ActiveDirectoryProvider::GetPreferredDomainControllers() const {
@@ -184,7 +185,7 @@ TrustRelationship ActiveDirectoryProvider::GetDomainTrustRelationship(const std:
 }
 
 void ActiveDirectoryProvider::SetSmartCardEnabledServices(const std::vector<std::string>& services) const {
-  Call(operations_->setSmartCardEnabledServices, NullTerminated(services).data());
+  ThrowUnlessSuccess(CallWithTexts(operations_->setSmartCardEnabledServices, services));
 }
 
 std::vector<std::string> ActiveDirectoryProvider::GetSmartCardEnabledServices() const {
