@@ -1,0 +1,2 @@
+/* Provides no operation. */
+#include "plugins/table.h"
