@@ -70,6 +70,30 @@ class VELMOR_EXPORT ActiveDirectoryStore : public DirectoryStore {
   /// which case the host has left the domain again.
   void JoinDomain(const std::string& domain, const Credentials& credentials, bool skipHostnameCheck);
 
+  /// The DNS name of the domain that the CAM server at this IPv4 address serves. *Deliberate:* never verifies
+  /// the server's certificate, since it is asked before anybody could trust one. Throws
+  /// InvalidIPAddressException; InvalidCAMProxyProviderException for "(none installed)", "(unset)" or a
+  /// plug-in that cannot be used; IOError when the plug-in cannot be loaded; and the exception of its status.
+  std::string GetDomainForCAMService(const std::string& camServer);
+
+  /// Stores the certificate that joins through the CAM proxy expect of the server, a PEM text.
+  /// Throws InvalidCertificateException, or OrvConfigStore::ConfigStoreException when it cannot be stored.
+  void ImportCertificateForCAM(const std::string& certificate);
+
+  /// As above with the text of the file at `path`; the second argument is not used. Throws
+  /// FileNotFoundException when the file cannot be opened.
+  void ImportCertificateForCAM(const std::string& path, const std::string& unused);
+
+  /// Joins the host with a computer account that the CAM server creates in `container`, or in the directory's
+  /// default place when that is empty. Whether the server's certificate must be the imported one is the
+  /// host's option "UserVars.ActiveDirectoryVerifyCAMCertificate".
+  ///
+  /// Throws InvalidIPAddressException, InvalidVerifyCAMCertificateOptionException, InvalidHostNameException,
+  /// InvalidCAMProxyProviderException, InvalidThumbprintStoreException, IOError and the exceptions of the two
+  /// plug-ins' statuses; the host is then not joined, though an account that was created stays. What
+  /// recording the join throws goes out after the host has left the domain again.
+  void JoinDomainWithCAM(const std::string& camServer, const std::string& container, bool skipHostnameCheck);
+
   /// Leaves the domain without an account and removes the record of the join.
   /// Throws the exception of the plug-in's status, or OrvConfigStore::ConfigStoreException, in which case the
   /// host has left but the record is still there.

@@ -5,6 +5,7 @@
 #include "authentication/active_directory_config_store.h"
 #include "authentication/active_directory_store.h"
 #include "authentication/authentication_store_factory.h"
+#include "authentication/cam_thumbprint_store.h"
 #include "authentication/configuration.h"
 #include "authentication/directory_records.h"
 #include "authentication/exception.h"
