@@ -1,0 +1,3 @@
+/* A shared object that is no CAM proxy plug-in. */
+extern int something;
+int something = 1;
