@@ -109,6 +109,7 @@ start_node() {
 install_in() {
   [[ -d $staged_tree ]] || return 0
   in_node "$1" cp -a --no-preserve=ownership "$staged_tree/." /
+  in_node "$1" ldconfig
 }
 
 is_member_node() { [[ $1 == host* || $1 == server* ]]; }

@@ -1,3 +1,4 @@
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -10,7 +11,6 @@
 
 #include "hostmgmt/replace_file.h"
 #include "kernctl/resolver_configuration.h"
-#include "system/make_directory.h"
 #include "system/read_file.h"
 #include "system/run_program.h"
 #include "system/system_error.h"
@@ -63,7 +63,7 @@ std::vector<std::string> DropInPaths() {
 }
 
 void MakeDropInDirectory() {
-  if (!HostMgmt::System::MakeDirectory(kDropInDirectory)) {
+  if (mkdir(kDropInDirectory, 0755) != 0 && errno != EEXIST) {
     HostMgmt::System::ThrowFileError("create", kDropInDirectory, errno);
   }
 }
