@@ -1,0 +1,33 @@
+#include "command.h"
+
+#include <unistd.h>
+
+#include "failure.h"
+
+namespace velmorctl {
+
+namespace {
+
+constexpr AddCommand commands[] = {AddStatusCommand,
+                                   AddJoinCommand,
+                                   AddLeaveCommand,
+                                   AddTrustCommand,
+                                   AddStoreCommand,
+                                   AddProviderCommand,
+                                   AddDomainControllerCommand,
+                                   AddSmartCardCommand,
+                                   AddOptionCommand};
+
+}  // namespace
+
+std::span<const AddCommand> Commands() {
+  return commands;
+}
+
+void RequireRoot(const std::string& doing) {
+  if (geteuid() != 0) {
+    throw Failure(ExitCode::NeedsRoot, "only root may " + doing).Try("run the command as root");
+  }
+}
+
+}  // namespace velmorctl

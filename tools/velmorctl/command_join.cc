@@ -1,0 +1,161 @@
+/// velmorctl join: makes the host a member of a domain.
+#include <iostream>
+
+#include "account.h"
+#include "authentication/active_directory_config_store.h"
+#include "command.h"
+#include "directory.h"
+#include "failure.h"
+#include "operation_lock.h"
+#include "password_source.h"
+#include "progress.h"
+#include "settings_file.h"
+#include "text.h"
+#include "trust_names.h"
+#include "watched_call.h"
+
+namespace velmorctl {
+
+namespace {
+
+using quenix::authentication::ActiveDirectoryConfigStore;
+
+/// As long as the library's own stores.
+constexpr std::chrono::seconds answerTimeout{60};
+
+constexpr char waitForEnd[] =
+    "interrupted: when the provider's call has ended, its join is undone (again: leave at once)";
+
+struct Options {
+  std::string target;
+  std::string userName = "Administrator";
+  PasswordSource password;
+  bool skipHostNameCheck = false;
+
+  std::string Domain() const { return target.substr(0, target.find('/')); }
+};
+
+void WatchHostFiles(Situation& situation) {
+  for (const char* file : {authenticationFile, "/etc/hosts", "/etc/resolv.conf", "/etc/samba/smb.conf"}) {
+    situation.Watch(file);
+  }
+}
+
+/// Finds out what would stand in the way after the join, before anything is changed.
+void RequireActivation(Directory& directory) {
+  SettingsInspection record =
+      InspectSettingsFile(authenticationFile, storeKey, "remote-authentication-store = \"None\"");
+  if (record.problem) {
+    throw AsFailure(*record.problem, ExitCode::Configuration,
+                    "the join could not be followed by the store's activation");
+  }
+  auto configuration = directory.Configuration();
+  const std::string& domain = configuration.value.activeDomain.dnsName;
+  if (configuration.live && !domain.empty()) {
+    throw Failure(ExitCode::Conflict, "the host is joined to " + domain + " already").Try("velmorctl leave");
+  }
+}
+
+std::shared_ptr<Account> ReadAccount(const Options& options) {
+  auto account = std::make_shared<Account>();
+  account->userName = options.userName;
+  options.password.Read(options.userName, account->password);
+  return account;
+}
+
+/// Leaves the domain again and removes the record of the join.
+[[noreturn]] void Undo(Directory& directory, const std::shared_ptr<Account>& account, Progress& progress,
+                       SignalPipe& signals, int signalNumber, Situation& situation) {
+  progress.Step("undoing the join");
+  auto undo = [store = directory.Store(), account] {
+    store->PartDomain(account->AsCredentials());
+    ActiveDirectoryConfigStore().RemoveDomainInfo();
+  };
+  CallOutcome outcome =
+      RunWatched(undo, progress, signals, "interrupted: the undoing goes on (again: leave at once)");
+  if (outcome.failure) {
+    throw Interrupted(signalNumber, "the join could not be undone: \"velmorctl leave\" does it");
+  }
+  situation.ForgetChanges();
+  throw Interrupted(signalNumber, "the host has left the domain again");
+}
+
+void JoinInterruptibly(const Options& options, Directory& directory, const std::shared_ptr<Account>& account,
+                       Progress& progress, Situation& situation) {
+  SignalPipe signals{SIGINT, SIGTERM, SIGHUP};
+  progress.Step("joining " + options.target + " as " + options.userName +
+                (options.skipHostNameCheck ? "" : ", after a check of the host's name"));
+  auto join = [store = directory.Store(), account, target = options.target,
+               skip = options.skipHostNameCheck] {
+    store->JoinDomain(target, account->AsCredentials(), skip);
+  };
+  CallOutcome outcome = RunWatched(join, progress, signals, waitForEnd);
+  situation.providerReason = progress.ProviderReason();
+  if (outcome.failure && outcome.signalNumber) {
+    throw Interrupted(*outcome.signalNumber, "the join had failed by then");
+  }
+  if (outcome.failure) {
+    std::rethrow_exception(outcome.failure);
+  }
+  situation.AddChange("the host has joined " + options.Domain());
+  progress.Step("joined " + options.Domain() + " and recorded it");
+  if (outcome.signalNumber) {
+    Undo(directory, account, progress, signals, *outcome.signalNumber, situation);
+  }
+}
+
+/// Asks the domain whether the join holds. From here on a signal ends the command at once.
+ExitCode Verify(Directory& directory, Progress& progress, const std::string& requestedDomain) {
+  auto configuration = directory.Configuration();
+  Answer<TrustState> state = directory.State();
+  const std::string& domain = configuration.value.activeDomain.dnsName;
+  progress.Step("trust state: " + TrustStateName(state.value) + (state.live ? "" : " (no answer in time)"));
+  std::cout << "The host is joined to " << Printable(domain.empty() ? requestedDomain : domain)
+            << ", and the store \"Active Directory\" is active.\n";
+  ExitCode code = state.live ? TrustStateExitCode(state.value) : ExitCode::FromCache;
+  if (code != ExitCode::Fine) {
+    std::cerr << "velmorctl: warning: the trust could not be verified: " << TrustStateName(state.value)
+              << "; try \"velmorctl status\" in a minute\n";
+  }
+  return code;
+}
+
+ExitCode Join(const Options& options, Situation& situation) {
+  RequireRoot("join a domain");
+  if (options.Domain().empty()) {
+    throw Failure(ExitCode::Usage, "the domain is missing").Try("velmorctl join corp.example/Servers/Hosts");
+  }
+  situation.doing = "join " + options.Domain() + " as " + options.userName;
+  WatchHostFiles(situation);
+  OperationLock lock;
+  Directory directory(answerTimeout);
+  RequireActivation(directory);
+  std::shared_ptr<Account> account = ReadAccount(options);
+  std::string provider = InspectProviderFile().value;
+  Progress progress(provider);
+  progress.Step("provider: " + provider);
+  JoinInterruptibly(options, directory, account, progress, situation);
+  account.reset();
+  situation.doing = "make the store \"Active Directory\" active";
+  progress.Step("making the store \"Active Directory\" active");
+  directory.Store()->MakeActive();
+  situation.doing = "verify the join";
+  return Verify(directory, progress, options.Domain());
+}
+
+}  // namespace
+
+void AddJoinCommand(CLI::App& root, Invocation& invocation) {
+  auto options = std::make_shared<Options>();
+  CLI::App* join = root.add_subcommand("join", "Join a domain");
+  join->add_option("DOMAIN[/OU]", options->target,
+                   "The domain's DNS name, and the organizational unit for the computer account")
+      ->required();
+  join->add_option("-U,--user", options->userName, "The account that may join hosts")->capture_default_str();
+  join->add_flag("--skip-hostname-check", options->skipHostNameCheck,
+                 "Take the host's name as it is, and leave the hosts file and the DNS search list alone");
+  options->password.AddOptions(*join);
+  Bind(*join, invocation, options, Join);
+}
+
+}  // namespace velmorctl
