@@ -1,13 +1,12 @@
 #include "hostmgmt/options_file.h"
 
-#include <sys/stat.h>
-
 #include <algorithm>
 #include <cerrno>
 #include <optional>
 #include <string_view>
 
 #include "hostmgmt/replace_file.h"
+#include "system/make_directory.h"
 #include "system/read_file.h"
 #include "system/resolve_links.h"
 #include "system/system_error.h"
@@ -68,8 +67,7 @@ void OptionsFile::Remove(const std::string& path) {
 
 void OptionsFile::Save() const {
   const std::string directory = System::DirectoryOf(kPath);
-  if (mkdir(directory.c_str(), 0755) != 0 && errno != EEXIST)
-    System::ThrowFileError("create", directory, errno);
+  if (!System::MakeDirectory(directory)) System::ThrowFileError("create", directory, errno);
   ReplaceFile(kPath, System::JoinLines(lines_));
 }
 

@@ -1,4 +1,3 @@
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
@@ -11,6 +10,7 @@
 
 #include "hostmgmt/replace_file.h"
 #include "kernctl/resolver_configuration.h"
+#include "system/make_directory.h"
 #include "system/read_file.h"
 #include "system/run_program.h"
 #include "system/system_error.h"
@@ -63,7 +63,7 @@ std::vector<std::string> DropInPaths() {
 }
 
 void MakeDropInDirectory() {
-  if (mkdir(kDropInDirectory, 0755) != 0 && errno != EEXIST) {
+  if (!HostMgmt::System::MakeDirectory(kDropInDirectory)) {
     HostMgmt::System::ThrowFileError("create", kDropInDirectory, errno);
   }
 }

@@ -16,6 +16,9 @@ void ThrowDatabaseError(sqlite3* connection) {
   if (code == SQLITE_READONLY_ROLLBACK) {
     ThrowDatabaseError("a change was cut short by a crash, and undoing it takes the right to write the file");
   }
+  if (code == SQLITE_READONLY_DIRECTORY) {
+    ThrowDatabaseError("it cannot be written: its directory takes no journal");
+  }
   if ((code & 0xff) == SQLITE_BUSY) ThrowDatabaseError("another process has held it for ten seconds");
   const int systemError = sqlite3_system_errno(connection);
   const bool isSystemFailure =

@@ -14,6 +14,7 @@
 
 #include "orvconfigstore/database_error.h"
 #include "system/file_descriptor.h"
+#include "system/make_directory.h"
 #include "system/system_error.h"
 
 namespace OrvConfigStore {
@@ -23,7 +24,6 @@ using HostMgmt::System::ErrorText;
 using HostMgmt::System::FileDescriptor;
 
 constexpr char kDirectory[] = "/var/lib/quenix";
-constexpr char kParentDirectory[] = "/var/lib";
 constexpr char kJournalPath[] = "/var/lib/quenix/configstore.db-journal";
 
 constexpr std::uint32_t kApplicationId = 0x4f726376;  // "Orcv"
@@ -72,14 +72,6 @@ std::string EmptyDatabase() {
 
 [[noreturn]] void ThrowCreationError(int errorNumber) {
   ThrowDatabaseError("it cannot be created: " + ErrorText(errorNumber));
-}
-
-void MakeDirectory() {
-  if (mkdir(kDirectory, 0755) != 0) {
-    if (errno == EEXIST) return;
-    ThrowCreationError(errno);
-  }
-  if (!HostMgmt::System::SyncDirectory(kParentDirectory)) ThrowCreationError(errno);
 }
 
 /// A file beside the database that holds an empty one; removed at the end. It is closed from the start: see
@@ -157,7 +149,7 @@ bool DatabaseExists() {
 
 void CreateDatabaseWhenMissing() {
   if (DatabaseExists()) return;
-  MakeDirectory();
+  if (!HostMgmt::System::MakeDirectory(kDirectory)) ThrowCreationError(errno);
   ScratchFile().BecomeDatabase();
   if (!HostMgmt::System::SyncDirectory(kDirectory)) ThrowCreationError(errno);
 }

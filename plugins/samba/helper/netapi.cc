@@ -1,0 +1,106 @@
+#include "helper/netapi.h"
+
+#include <netapi.h>
+
+#include <cstring>
+
+#include "common/status.h"
+
+namespace sambaprovider::netapi {
+namespace {
+
+// libnetapi's own codes where the library wants another one.
+constexpr uint32_t kMustRestart = 2713;  // success of the second half
+constexpr uint32_t kNotFound = 1168;
+constexpr uint32_t kAccountExpired = 1793;
+constexpr uint32_t kPasswordMustChange = 1907;
+constexpr uint32_t kDomainControllerNotFound = 1908;
+constexpr uint32_t kUnableToFindController = 2453;
+constexpr uint32_t kUnitRefused = 2694;
+
+uint32_t StatusOf(uint32_t code) {
+  switch (code) {
+    case kNotFound:
+      return kLogonFailure;
+    case kAccountExpired:
+      return kAccountDisabled;
+    case kPasswordMustChange:
+      return kPasswordExpired;
+    case kDomainControllerNotFound:
+    case kUnableToFindController:
+      return kNoLogonServers;
+    case kUnitRefused:
+      // The unit was seen to exist before, so what is missing is the right to write into it.
+      return kAccessDenied;
+    default:
+      return code;
+  }
+}
+
+libnetapi_ctx* Context() {
+  static libnetapi_ctx* const context = [] {
+    libnetapi_ctx* made = nullptr;
+    const NET_API_STATUS status = libnetapi_init(&made);
+    if (status != 0) throw Failure(kInternalError, "libnetapi does not start: " + std::to_string(status));
+    return made;
+  }();
+  return context;
+}
+
+void Check(NET_API_STATUS result, const char* action) {
+  if (result == 0) return;
+  const auto code = static_cast<uint32_t>(result);
+  const char* reason = libnetapi_get_error_string(Context(), result);
+  throw Failure(StatusOf(code), std::string(action) + ": " + (reason == nullptr ? "" : reason) + " (code " +
+                                    std::to_string(code) + ")");
+}
+
+}  // namespace
+
+Secret ProvisionAccount(const std::string& dnsDomain, const std::string& computer,
+                        const std::string& organizationalUnitDn, const std::string& controller,
+                        const std::string& user, const Secret& password) {
+  Check(libnetapi_set_username(Context(), user.c_str()), "the user name was set");
+  Check(libnetapi_set_password(Context(), password.Text()), "the password was set");
+  const char* text = nullptr;
+  Check(NetProvisionComputerAccount(dnsDomain.c_str(), computer.c_str(),
+                                    organizationalUnitDn.empty() ? nullptr : organizationalUnitDn.c_str(),
+                                    controller.c_str(), NETSETUP_PROVISION_REUSE_ACCOUNT, nullptr, nullptr,
+                                    &text),
+        "the computer account was made");
+  Secret blob{std::string_view(text)};
+  char* const original = const_cast<char*>(text);
+  explicit_bzero(original, blob.Size());
+  NetApiBufferFree(original);
+  return blob;
+}
+
+void StoreSecrets(const Secret& blob) {
+  // The call takes UTF-16 with a byte order mark and a terminator.
+  Secret wide(4 + 2 * blob.Size());
+  char* to = wide.Data();
+  *to++ = '\xff';
+  *to++ = '\xfe';
+  for (const char byte : blob.View()) {
+    *to = byte;
+    to += 2;
+  }
+  const NET_API_STATUS result =
+      NetRequestOfflineDomainJoin(reinterpret_cast<uint8_t*>(wide.Data()), static_cast<uint32_t>(wide.Size()),
+                                  NETSETUP_PROVISION_ONLINE_CALLER, nullptr);
+  if (static_cast<uint32_t>(result) != kMustRestart) Check(result, "the machine's secrets were stored");
+}
+
+void Unjoin(const std::string& user, const Secret& password) {
+  Context();
+  Check(NetUnjoinDomain(nullptr, user.c_str(), password.Text(), NETSETUP_JOIN_DOMAIN | NETSETUP_ACCT_DELETE),
+        "the domain was left");
+}
+
+void UnjoinLocally() {
+  Context();
+  // It insists on an account although it uses none without NETSETUP_ACCT_DELETE.
+  Check(NetUnjoinDomain(nullptr, "none", "none", NETSETUP_JOIN_DOMAIN), "the machine's secrets were removed");
+}
+
+}  // namespace sambaprovider::netapi

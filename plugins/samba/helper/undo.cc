@@ -1,0 +1,94 @@
+#include "helper/undo.h"
+
+#include "common/files.h"
+#include "common/names.h"
+#include "common/paths.h"
+#include "common/smb_conf.h"
+#include "common/state.h"
+#include "common/status.h"
+#include "helper/before_join.h"
+#include "helper/domain_locator.h"
+#include "helper/netapi.h"
+#include "helper/precheck.h"
+#include "helper/winbind_service.h"
+
+namespace sambaprovider {
+namespace {
+
+constexpr const char* kStep = "undo";
+
+// Runs one part; whether it worked.
+template <typename Part>
+bool Try(const AttemptLog& log, const std::string& done, const Part& part) {
+  try {
+    part();
+    log.Note(kStep, done);
+    return true;
+  } catch (const Failure& failure) {
+    log.Note(kStep, std::string("not ") + done + ": " + failure.what());
+    return false;
+  }
+}
+
+bool SmbConfIsOurs() {
+  return OwnerOfSmbConf(ReadFile(paths::kSmbConf), ReadFile(paths::kWrittenSmbConf), std::nullopt) ==
+         SmbConfOwner::kProvider;
+}
+
+void RestoreService() {
+  winbind_service::Stop();
+  if (before_join::ServiceWasRunning()) winbind_service::Start();
+}
+
+}  // namespace
+
+void UndoJoin(const AttemptLog& log, const Journal& journal, const UndoAccount* account) {
+  log.Begin(kStep, "taking the join of " + journal.dnsDomain + " back");
+  // libnetapi finds the secrets by the domain in smb.conf, so this comes before smb.conf is given back. There
+  // may be no secrets yet, which it reports as an error.
+  if (SmbConfIsOurs()) Try(log, "removed the machine's secrets", [] { netapi::UnjoinLocally(); });
+  if (journal.accountIsNew && account != nullptr) {
+    Try(log, "removed the computer account", [&] {
+      RemoveAccount({journal.dnsDomain, LocateControllers(journal.dnsDomain), account->user,
+                     account->password, journal.computer});
+    });
+  }
+  const bool restored = Try(log, "gave smb.conf and the keytab back", [] { before_join::GiveBack(); });
+  Try(log, "put winbindd back as it was", RestoreService);
+  if (restored) {
+    RemoveJournal();
+    before_join::DropCopies();
+  }
+  log.End(kStep, kSuccess,
+          restored ? "the host is as it was before" : "the rest is tried again at the next run");
+}
+
+void FinishLeave(const AttemptLog& log) {
+  log.Run("configure", "giving smb.conf and the keytab back", [] {
+    before_join::GiveBack();
+    return "as before the join";
+  });
+  log.Run("state", "forgetting the domain", [] {
+    State state = LoadState();
+    state.joined = false;
+    state.dnsDomain.clear();
+    state.netbiosDomain.clear();
+    state.hostName.clear();
+    state.machineAccountDn.clear();
+    SaveState(state);
+    return "the host has joined no domain";
+  });
+  // The host has left by now; a winbindd that does not come back is told, but is no failed leave.
+  try {
+    log.Run("service", "putting winbindd back as it was before the join", [] {
+      RestoreService();
+      return before_join::ServiceWasRunning() ? "winbindd runs" : "winbindd is stopped";
+    });
+  } catch (const Failure&) {
+    log.Note("service", "winbindd is left as it is");
+  }
+  RemoveJournal();
+  before_join::DropCopies();
+}
+
+}  // namespace sambaprovider

@@ -1,0 +1,154 @@
+// velmor-samba-precheck: tries a password once with Kerberos and looks at the directory with it.
+//
+// A process of its own, because MIT Kerberos, which OpenLDAP's log-on uses, and the Kerberos that libnetapi
+// brings do not mix. Reads one request (common/message.h) and answers it:
+//
+//   "operation": "inspect" or "remove"
+//   "dnsDomain", "user", "controllers" (names, best first), "computer", and the password as the secret
+//   "organizationalUnit": for inspect; may be empty
+//   "computerDnsName": for remove; the account is deleted only when it has this DNS host name, or none
+//
+// An answer has "step", where it stopped: "locate", "password", "clock" or "account". An inspect with status
+// 0 adds "controller", "netbiosDomain", "organizationalUnitDn", "accountDn" and "accountHostName".
+#include <sys/prctl.h>
+
+#include <cstdlib>
+#include <ctime>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "common/message.h"
+#include "common/names.h"
+#include "common/organizational_unit.h"
+#include "common/status.h"
+#include "precheck/directory.h"
+#include "precheck/kerberos.h"
+
+namespace sambaprovider {
+namespace {
+
+constexpr std::chrono::seconds kLdapTimeout{5};
+constexpr size_t kMostControllers = 4;
+constexpr int64_t kLargestSkew = 300;
+
+class Precheck {
+ public:
+  explicit Precheck(const Request& request) : request_(request) {}
+
+  const std::string& Step() const { return step_; }
+
+  nlohmann::json Answer() {
+    Connect();
+    CheckPassword();
+    CheckClock();
+    step_ = "account";
+    directory_->Bind();
+    return request_.Text("operation") == "remove" ? Remove() : Inspect();
+  }
+
+ private:
+  // Finds the first controller that answers. It is asked everything that follows, so that no replication lag
+  // between two of them can be seen.
+  void Connect() {
+    step_ = "locate";
+    std::string reasons;
+    const auto controllers = request_.fields.value("controllers", std::vector<std::string>());
+    for (size_t index = 0; index < controllers.size() && index < kMostControllers; ++index) {
+      try {
+        directory_ = std::make_unique<Directory>(controllers[index], kLdapTimeout);
+        root_ = directory_->ReadRootEntry();
+        controller_ = root_.controllerDnsName.empty() ? controllers[index] : root_.controllerDnsName;
+        offset_ = root_.currentTime - time(nullptr);
+        return;
+      } catch (const Failure& failure) {
+        reasons += "; " + controllers[index] + ": " + failure.what();
+      }
+    }
+    throw Failure(kNoLogonServers, "no domain controller answers" + reasons);
+  }
+
+  void CheckPassword() {
+    step_ = "password";
+    const std::string realm = UpperCase(request_.Text("dnsDomain"));
+    DirectKerberosTo(realm, controller_);
+    LogOn(realm, SplitAccountName(request_.Text("user")), request_.secret);
+  }
+
+  void CheckClock() {
+    step_ = "clock";
+    if (std::abs(offset_) <= kLargestSkew) return;
+    throw Failure(kTimeSkew, controller_ + "'s clock differs from the host's by " + std::to_string(offset_) +
+                                 " seconds; at most " + std::to_string(kLargestSkew) + " are allowed");
+  }
+
+  nlohmann::json Remove() {
+    const ComputerAccount account = directory_->FindComputer(root_, request_.Text("computer"));
+    std::string text = "there is no computer account to remove";
+    if (!account.dn.empty()) {
+      if (!account.dnsHostName.empty() &&
+          !EqualWithoutCase(account.dnsHostName, request_.Text("computerDnsName"))) {
+        throw Failure(kAccountExists, account.dn + " belongs to " + account.dnsHostName);
+      }
+      directory_->Delete(account.dn);
+      text = "removed " + account.dn;
+    }
+    return {{"status", kSuccess}, {"text", text}, {"step", step_}};
+  }
+
+  nlohmann::json Inspect() {
+    const ComputerAccount account = directory_->FindComputer(root_, request_.Text("computer"));
+    return {{"status", kSuccess},
+            {"text",
+             controller_ + " accepts the password; its clock differs by " + std::to_string(offset_) + " s"},
+            {"step", step_},
+            {"controller", controller_},
+            {"netbiosDomain", directory_->NetbiosName(root_)},
+            {"organizationalUnitDn", FindOrganizationalUnit()},
+            {"accountDn", account.dn},
+            {"accountHostName", account.dnsHostName}};
+  }
+
+  std::string FindOrganizationalUnit() {
+    const std::string text = request_.Text("organizationalUnit");
+    if (text.empty()) return "";
+    const std::string dn = OrganizationalUnitDn(text, root_.baseDn);
+    if (directory_->Exists(dn)) return dn;
+    throw Failure(kInvalidOrganizationalUnit, "the organisational unit " + dn + " does not exist");
+  }
+
+  const Request& request_;
+  std::string step_ = "locate";
+  std::unique_ptr<Directory> directory_;
+  RootEntry root_;
+  std::string controller_;
+  int64_t offset_ = 0;
+};
+
+nlohmann::json AnswerRequest() {
+  std::string step = "locate";
+  try {
+    const Request request = ReceiveRequest();
+    Precheck precheck(request);
+    try {
+      return precheck.Answer();
+    } catch (...) {
+      step = precheck.Step();
+      throw;
+    }
+  } catch (const Failure& failure) {
+    return {{"status", failure.Code()}, {"text", failure.what()}, {"step", step}};
+  } catch (const std::exception& error) {
+    return {{"status", kInternalError}, {"text", error.what()}, {"step", step}};
+  }
+}
+
+}  // namespace
+}  // namespace sambaprovider
+
+int main() {
+  // A core file would hold the password.
+  prctl(PR_SET_DUMPABLE, 0, 0, 0, 0);
+  sambaprovider::SendAnswer(sambaprovider::AnswerRequest());
+  return 0;
+}
