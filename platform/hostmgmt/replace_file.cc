@@ -94,8 +94,8 @@ void CopyAttributes(const std::string& path, int descriptor) {
   }
 }
 
-/// Gives the new file what belongs to the old one. The order matters: a change of owner clears mode bits,
-/// and an access list overrules the mode.
+/// Gives the new file, once it is written, what belongs to the old one. The order matters: writing and a
+/// change of owner clear mode bits and attributes, and an access list overrules the mode.
 void CopyMetadata(const std::string& path, const struct stat& old, int descriptor) {
   // EINVAL: the owner is one that this user namespace does not know, so that nothing here can be his.
   if (fchown(descriptor, old.st_uid, old.st_gid) != 0 && errno != EINVAL) ThrowWriteError(path, errno);
@@ -147,12 +147,13 @@ void ReplaceFile(const std::string& path, const std::string& content, mode_t mod
   if (temporary.GetCreationError() != 0) ThrowWriteError(target, temporary.GetCreationError());
 
   const int descriptor = temporary.GetDescriptor();
+  if (!System::WriteAll(descriptor, content)) ThrowWriteError(target, errno);
   if (exists) {
     CopyMetadata(target, old, descriptor);
   } else if (fchmod(descriptor, modeWhenNew) != 0) {
     ThrowWriteError(target, errno);
   }
-  if (!System::WriteAll(descriptor, content) || fsync(descriptor) != 0) ThrowWriteError(target, errno);
+  if (fsync(descriptor) != 0) ThrowWriteError(target, errno);
   if (!temporary.TakePlaceOf(target)) {
     // Nothing can take the place of a mount point.
     if (errno == EBUSY && exists) return WriteInPlace(target, content);

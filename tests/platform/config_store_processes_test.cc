@@ -229,11 +229,12 @@ void BecomeUnprivileged() {
 
 TEST(ConfigStoreRightsTest, AnUnprivilegedProcessReads) {
   Put("one", "value");
-  EXPECT_EQ(EndOf(StartProcess([] {
-              BecomeUnprivileged();
-              return Get("one") == "value" && access(kDatabase.c_str(), W_OK) != 0 ? 0 : 1;
-            })),
-            0);
+  EXPECT_EQ(
+      EndOf(StartProcess([] {
+        BecomeUnprivileged();
+        return Get("one") == "value" && faccessat(AT_FDCWD, kDatabase.c_str(), W_OK, AT_EACCESS) != 0 ? 0 : 1;
+      })),
+      0);
 }
 
 TEST(ConfigStoreRightsTest, AnUnprivilegedProcessFindsAnEmptyStoreWhereNoneIs) {

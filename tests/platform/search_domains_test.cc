@@ -210,10 +210,10 @@ TEST(SearchDomainsTest, TheHostHasOneStack) {
 }
 
 TEST(SearchDomainsTest, AFileThatCannotBeReadFailsAtOpening) {
-  testsupport::RemoveFile(kFile);
-  ASSERT_EQ(mkdir(kFile.c_str(), 0755), 0);
+  ASSERT_EQ(chmod(kFile.c_str(), 0), 0);
+  const testsupport::WithoutFilePowers powerless;
   EXPECT_THROW_WHAT(DnsConfigImpl("defaultTcpipStack"), HostMgmtException,
-                    "Unable to read '/etc/resolv.conf': it is not a regular file");
+                    "Unable to read '/etc/resolv.conf': Permission denied");
 }
 
 }  // namespace
