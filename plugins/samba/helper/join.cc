@@ -61,6 +61,9 @@ class Membership {
     before_join::PutAside();
     SaveJournal(journal_);
     call_.log.Run("configure", "writing smb.conf for " + state_.netbiosDomain, [&] {
+      winbind_service::Stop();
+      // Samba remembers for a while which controllers did not answer, also those that do now.
+      winbind_service::FlushCache();
       WriteSmbConf(FormatSmbConf(state_, call_.settings, KeytabUse::kDuringJoin));
       return "written";
     });
@@ -86,8 +89,6 @@ class Membership {
   void StartService() {
     StopWhenCallerHasGone();
     call_.log.Run("service", "starting winbindd", [] {
-      winbind_service::Stop();
-      winbind_service::FlushCache();
       winbind_service::Start();
       return "winbindd answers";
     });
@@ -143,7 +144,7 @@ std::string Join(const Call& call) {
     CheckUser(user);
     return computer + " may join";
   });
-  const LogonRequest logon{domain, ControllersOf(call.log, domain), user, call.request.secret, computer};
+  LogonRequest logon{domain, ControllersOf(call.log, domain), user, call.request.secret, computer};
   const Inspection found = Inspect(call.log, logon, call.request.Text("organizationalUnit"));
   call.log.Run("account", "looking for a computer account " + computer, [&] {
     CheckAccount(found, HostDnsName(computer, domain), call.settings);
@@ -151,6 +152,8 @@ std::string Join(const Call& call) {
   });
   StopWhenCallerHasGone();
 
+  // Another controller may not know the new account yet.
+  logon.controllers = {found.controller};
   const Journal journal{Journal::Operation::kJoin, domain, found.netbiosDomain, computer,
                         found.accountDn.empty()};
   Membership membership(call, MemberState(domain, found.netbiosDomain, computer), journal);
@@ -166,7 +169,7 @@ std::string Join(const Call& call) {
     blob = Secret();
     membership.CreateKeytab();
     membership.StartService();
-    membership.Finish(found.accountDn.empty() ? FindMachineAccountDn(computer) : found.accountDn);
+    membership.Finish(found.accountDn.empty() ? FindAccountDn(logon) : found.accountDn);
   } catch (...) {
     const UndoAccount account{user, call.request.secret};
     UndoJoin(call.log, journal, &account);

@@ -62,7 +62,7 @@ std::string Refresh(const Call& call) {
   if (!state.joined) return "the host has joined no domain";
   const auto passwordTime = MachinePasswordTime(state.netbiosDomain);
   const auto keytabTime = KeytabTime();
-  if (!keytabTime || (passwordTime && *passwordTime > *keytabTime)) {
+  if (!keytabTime || (passwordTime && *passwordTime >= *keytabTime)) {
     call.log.Run("keytab", "the machine's password is newer than the keytab: making it anew", [] {
       MakeKeytab();
       return "made";

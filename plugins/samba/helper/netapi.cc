@@ -60,14 +60,14 @@ void Check(NET_API_STATUS result, const char* action) {
 Secret ProvisionAccount(const std::string& dnsDomain, const std::string& computer,
                         const std::string& organizationalUnitDn, const std::string& controller,
                         const std::string& user, const Secret& password) {
-  Check(libnetapi_set_username(Context(), user.c_str()), "the user name was set");
-  Check(libnetapi_set_password(Context(), password.Text()), "the password was set");
+  Check(libnetapi_set_username(Context(), user.c_str()), "setting the user name");
+  Check(libnetapi_set_password(Context(), password.Text()), "setting the password");
   const char* text = nullptr;
   Check(NetProvisionComputerAccount(dnsDomain.c_str(), computer.c_str(),
                                     organizationalUnitDn.empty() ? nullptr : organizationalUnitDn.c_str(),
                                     controller.c_str(), NETSETUP_PROVISION_REUSE_ACCOUNT, nullptr, nullptr,
                                     &text),
-        "the computer account was made");
+        "making the computer account");
   Secret blob{std::string_view(text)};
   char* const original = const_cast<char*>(text);
   explicit_bzero(original, blob.Size());
@@ -88,19 +88,20 @@ void StoreSecrets(const Secret& blob) {
   const NET_API_STATUS result =
       NetRequestOfflineDomainJoin(reinterpret_cast<uint8_t*>(wide.Data()), static_cast<uint32_t>(wide.Size()),
                                   NETSETUP_PROVISION_ONLINE_CALLER, nullptr);
-  if (static_cast<uint32_t>(result) != kMustRestart) Check(result, "the machine's secrets were stored");
+  if (static_cast<uint32_t>(result) != kMustRestart) Check(result, "storing the machine's secrets");
 }
 
 void Unjoin(const std::string& user, const Secret& password) {
   Context();
   Check(NetUnjoinDomain(nullptr, user.c_str(), password.Text(), NETSETUP_JOIN_DOMAIN | NETSETUP_ACCT_DELETE),
-        "the domain was left");
+        "leaving the domain");
 }
 
 void UnjoinLocally() {
   Context();
-  // It insists on an account although it uses none without NETSETUP_ACCT_DELETE.
-  Check(NetUnjoinDomain(nullptr, "none", "none", NETSETUP_JOIN_DOMAIN), "the machine's secrets were removed");
+  // Without a server's name it looks for a domain controller, although it does not need one; a name that stands
+  // for this host spares that. It also insists on an account that it does not use.
+  Check(NetUnjoinDomain("127.0.0.1", "none", "none", NETSETUP_JOIN_DOMAIN), "removing the machine's secrets");
 }
 
 }  // namespace sambaprovider::netapi

@@ -1,7 +1,7 @@
 #include "helper/precheck.h"
 
-#include <array>
 #include <chrono>
+#include <utility>
 
 #include "common/message.h"
 #include "common/names.h"
@@ -39,25 +39,19 @@ void RequireSuccess(const Answer& answer) {
   if (StatusIn(answer) != kSuccess) throw Failure(StatusIn(answer), answer.fields["text"].get<std::string>());
 }
 
-// The pre-check does several steps in one go and says at which it stopped.
+// The pre-check does several steps in one go and says how far it got.
 void RecordSteps(const AttemptLog& log, const Answer& answer) {
-  constexpr std::array<const char*, 4> kSteps = {"locate", "password", "clock", "account"};
-  const std::string last = answer.fields.value("step", "password");
-  for (const char* step : kSteps) {
-    if (step == last) {
-      log.End(step, StatusIn(answer), answer.fields["text"].get<std::string>());
-      return;
-    }
-    log.End(step, kSuccess, "fine");
-  }
+  using Steps = std::vector<std::pair<std::string, std::string>>;
+  for (const auto& [step, text] : answer.fields.value("done", Steps())) log.End(step, kSuccess, text);
+  if (StatusIn(answer) == kSuccess) return;
+  log.End(answer.fields.value("step", "connect"), StatusIn(answer), answer.fields["text"].get<std::string>());
 }
 
 }  // namespace
 
 Inspection Inspect(const AttemptLog& log, const LogonRequest& request,
                    const std::string& organizationalUnit) {
-  log.Begin("password", "asking a controller of " + request.dnsDomain +
-                            " whether it accepts the password of " + request.user);
+  log.Begin("connect", "trying the password of " + request.user + " at a controller of " + request.dnsDomain);
   const Answer answer = AskPrecheck("inspect", request, {{"organizationalUnit", organizationalUnit}});
   RecordSteps(log, answer);
   RequireSuccess(answer);
@@ -72,6 +66,12 @@ Inspection Inspect(const AttemptLog& log, const LogonRequest& request,
                   "the directory gives an impossible NetBIOS name for " + request.dnsDomain);
   }
   return result;
+}
+
+std::string FindAccountDn(const LogonRequest& request) {
+  const Answer answer = AskPrecheck("inspect", request, nlohmann::json::object());
+  RequireSuccess(answer);
+  return answer.fields.value("accountDn", "");
 }
 
 void RemoveAccount(const LogonRequest& request) {

@@ -28,9 +28,13 @@ struct Inspection {
   std::string accountHostName;
 };
 
-// Tries the password exactly once and looks at the directory. Records the steps "password", "clock" and
-// "account". Throws Failure with the reason; kNoLogonServers also when nothing came back in time.
+// Tries the password exactly once and looks at the directory. Records the steps "connect", "password" and
+// "clock", and "account" when it fails there. Throws Failure with the reason; kNoLogonServers also when
+// nothing came back in time.
 Inspection Inspect(const AttemptLog& log, const LogonRequest& request, const std::string& organizationalUnit);
+
+// The DN of this host's computer account; empty when there is none. Throws Failure.
+std::string FindAccountDn(const LogonRequest& request);
 
 // Removes this host's computer account. Throws Failure.
 void RemoveAccount(const LogonRequest& request);

@@ -30,6 +30,7 @@ constexpr const char* kProgram = "/usr/sbin/winbindd";
 constexpr const char* kProcessFile = "/run/samba/winbindd.pid";
 constexpr const char* kUnit = "winbind.service";
 constexpr std::chrono::seconds kStartTime{15};
+constexpr std::chrono::seconds kFriendlyStopTime{5};
 constexpr std::chrono::seconds kStopTime{15};
 constexpr std::chrono::milliseconds kPause{20};
 
@@ -37,24 +38,31 @@ bool SystemdRuns() {
   return FileExists("/run/systemd/system");
 }
 
-void SystemCtl(const char* verb, std::chrono::milliseconds limit) {
-  const ProgramResult result =
-      RunProgram({"/usr/bin/systemctl", "--no-ask-password", verb, kUnit}, ProgramOutput::kWanted, limit);
+void SystemCtl(const std::vector<std::string>& verb, std::chrono::milliseconds limit) {
+  std::vector<std::string> command = {"/usr/bin/systemctl", "--no-ask-password", kUnit};
+  command.insert(command.end() - 1, verb.begin(), verb.end());
+  const ProgramResult result = RunProgram(command, ProgramOutput::kWanted, limit);
   if (result.exitStatus == 0) return;
   throw Failure(kServiceNotActive,
-                std::string("systemctl ") + verb + " " + kUnit + " failed: " + LastLine(result.output));
+                std::string("systemctl ") + verb.front() + " " + kUnit + " failed: " + LastLine(result.output));
 }
 
-// The running winbindd; nothing when none runs.
-UniqueFd RunningProcess() {
+struct Process {
+  pid_t number = -1;
+  UniqueFd handle;
+};
+
+// The running winbindd; the handle is closed when none runs.
+Process RunningProcess() {
   const std::string text = ReadFile(kProcessFile).value_or("");
-  pid_t process = 0;
-  std::from_chars(text.data(), text.data() + text.size(), process);
-  if (process <= 0) return {};
-  UniqueFd handle(pidfd_open(process, 0));
+  Process process;
+  std::from_chars(text.data(), text.data() + text.size(), process.number);
+  if (process.number <= 0) return {};
+  process.handle = UniqueFd(pidfd_open(process.number, 0));
   // The file may be left over from a process whose number now belongs to another.
-  const std::string name = ReadFile("/proc/" + std::to_string(process) + "/comm").value_or("");
-  return name.rfind("winbindd", 0) == 0 ? std::move(handle) : UniqueFd();
+  const std::string name = ReadFile("/proc/" + std::to_string(process.number) + "/comm").value_or("");
+  if (name.rfind("winbindd", 0) != 0) return {};
+  return process;
 }
 
 bool Answers() {
@@ -79,13 +87,30 @@ void StartDirectly() {
     throw Failure(kServiceNotActive, "winbindd does not start; see /var/log/samba/log.winbindd");
 }
 
+bool EndsWithin(const UniqueFd& process, std::chrono::milliseconds limit) {
+  pollfd entry = {process.Get(), POLLIN, 0};
+  return poll(&entry, 1, static_cast<int>(limit.count())) == 1;
+}
+
+// While a controller does not answer, winbindd does not react to a friendly signal for a long time.
 void StopDirectly() {
-  const UniqueFd process = RunningProcess();
+  const auto [number, process] = RunningProcess();
   if (!process.IsOpen()) return;
   pidfd_send_signal(process.Get(), SIGTERM, nullptr, 0);
-  pollfd entry = {process.Get(), POLLIN, 0};
-  if (poll(&entry, 1, static_cast<int>(std::chrono::milliseconds(kStopTime).count())) == 1) return;
-  throw Failure(kServiceNotActive, "winbindd does not end");
+  if (EndsWithin(process, kFriendlyStopTime)) return;
+  // Its children wait in the same way; as a daemon it leads their process group.
+  if (getpgid(number) == number) kill(-number, SIGKILL);
+  pidfd_send_signal(process.Get(), SIGKILL, nullptr, 0);
+  if (!EndsWithin(process, kStopTime)) throw Failure(kServiceNotActive, "winbindd does not end");
+}
+
+void StopThroughSystemd() {
+  try {
+    SystemCtl({"stop"}, kFriendlyStopTime);
+  } catch (const Failure&) {
+    SystemCtl({"kill", "--signal=SIGKILL"}, kStopTime);
+    SystemCtl({"stop"}, kStopTime);
+  }
 }
 
 }  // namespace
@@ -96,7 +121,7 @@ void RequireInstalled() {
 }
 
 bool IsRunning() {
-  if (!SystemdRuns()) return RunningProcess().IsOpen();
+  if (!SystemdRuns()) return RunningProcess().handle.IsOpen();
   return RunProgram({"/usr/bin/systemctl", "--quiet", "is-active", kUnit}, ProgramOutput::kDropped,
                     kStartTime)
              .exitStatus == 0;
@@ -104,7 +129,7 @@ bool IsRunning() {
 
 void Start() {
   if (SystemdRuns()) {
-    SystemCtl("start", kStartTime);
+    SystemCtl({"start"}, kStartTime);
   } else {
     StartDirectly();
   }
@@ -119,7 +144,7 @@ void Start() {
 
 void Stop() {
   if (SystemdRuns()) {
-    SystemCtl("stop", kStopTime);
+    StopThroughSystemd();
   } else {
     StopDirectly();
   }

@@ -28,23 +28,18 @@ void Recover(Request& request, const AttemptLog& log) {
   log.Note("undo", "what was left could not be put right; the next operation tries again");
 }
 
-void RunAlone(Request& request, const AttemptLog& log) {
-  const Settings settings = LoadSettings();
-  const Answer answer = AskHelper(request, settings.operationTimeout);
-  if (answer.end == Conversation::End::kAnswered) {
-    const auto status = answer.fields["status"].get<uint32_t>();
-    if (status != kSuccess) throw Failure(status, answer.fields["text"].get<std::string>());
-    return;
-  }
+// Returns the helper's answer; throws when there is none.
+Answer AskAlone(Request& request, const AttemptLog& log) {
+  const std::unique_lock<std::mutex> lock(oneOperation, std::try_to_lock);
+  if (!lock.owns_lock()) throw Failure(kBusy, "this process has another join, leave or change running");
+  const std::chrono::seconds limit = LoadSettings().operationTimeout;
+  Answer answer = AskHelper(request, limit);
+  if (answer.end == Conversation::End::kAnswered) return answer;
   const bool late = answer.end == Conversation::End::kDeadline;
-  const Failure failure =
-      late ? Failure(kTimedOut,
-                     "not done after " + std::to_string(settings.operationTimeout.count()) + " seconds")
-           : Failure(kHelperDied, "the helper died");
-  log.Note("undo", failure.what());
+  log.Note("undo", late ? "the helper was ended at the deadline" : "the helper died");
   Recover(request, log);
-  log.End("result", failure.Code(), failure.what());
-  throw failure;
+  if (!late) throw Failure(kHelperDied, "the helper died");
+  throw Failure(kTimedOut, "not done after " + std::to_string(limit.count()) + " seconds");
 }
 
 }  // namespace
@@ -52,13 +47,16 @@ void RunAlone(Request& request, const AttemptLog& log) {
 void RunHelper(Request request) {
   request.fields["process"] = getpid();
   const AttemptLog log(getpid(), request.Text("operation"));
-  const std::unique_lock<std::mutex> lock(oneOperation, std::try_to_lock);
-  if (!lock.owns_lock()) {
-    const Failure failure(kBusy, "this process has another join, leave or change running");
+  Answer answer;
+  try {
+    answer = AskAlone(request, log);
+  } catch (const Failure& failure) {
+    // What the helper answers it has recorded itself.
     log.End("result", failure.Code(), failure.what());
-    throw failure;
+    throw;
   }
-  RunAlone(request, log);
+  const auto status = answer.fields["status"].get<uint32_t>();
+  if (status != kSuccess) throw Failure(status, answer.fields["text"].get<std::string>());
 }
 
 }  // namespace sambaprovider

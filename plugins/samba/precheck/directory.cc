@@ -56,7 +56,7 @@ std::optional<Message> Search(LDAP* connection, const std::string& base, int sco
                                       nullptr, nullptr, 0, &found);
   Message message(found);
   if (error == LDAP_NO_SUCH_OBJECT) return std::nullopt;
-  Check(connection, error, "the directory was searched");
+  Check(connection, error, "searching the directory");
   return message;
 }
 
@@ -118,7 +118,7 @@ RootEntry Directory::ReadRootEntry() {
   const int error = ldap_search_ext_s(connection_, "", LDAP_SCOPE_BASE, "(objectClass=*)", nullptr, 0,
                                       nullptr, nullptr, nullptr, 0, &found);
   const Message message(found);
-  Check(connection_, error, "the controller was asked for its time");
+  Check(connection_, error, "asking for its time");
   LDAPMessage* entry = ldap_first_entry(connection_, found);
   if (entry == nullptr) throw Failure(kNoLogonServers, "the controller does not answer as a directory");
   return {Value(connection_, entry, "dnsHostName"), Value(connection_, entry, "defaultNamingContext"),
@@ -130,7 +130,7 @@ void Directory::Bind() {
   Check(connection_,
         ldap_sasl_interactive_bind_s(connection_, nullptr, "GSSAPI", nullptr, nullptr, LDAP_SASL_QUIET,
                                      AnswerNothing, nullptr),
-        "the directory was logged on to");
+        "logging on to the directory");
 }
 
 std::string Directory::NetbiosName(const RootEntry& root) {
@@ -157,7 +157,7 @@ bool Directory::Exists(const std::string& dn) {
 
 void Directory::Delete(const std::string& dn) {
   Check(connection_, ldap_delete_ext_s(connection_, dn.c_str(), nullptr, nullptr),
-        "the computer account was deleted");
+        "deleting the computer account");
 }
 
 }  // namespace sambaprovider

@@ -16,6 +16,7 @@
 #include <ctime>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "common/message.h"
@@ -36,13 +37,14 @@ class Precheck {
  public:
   explicit Precheck(const Request& request) : request_(request) {}
 
-  const std::string& Step() const { return step_; }
+  // How far it has got, for the answer.
+  nlohmann::json Progress() const { return {{"step", step_}, {"done", done_}}; }
 
   nlohmann::json Answer() {
     Connect();
     CheckPassword();
     CheckClock();
-    step_ = "account";
+    NextStep("account", "the clocks differ by " + std::to_string(offset_) + " s");
     directory_->Bind();
     return request_.Text("operation") == "remove" ? Remove() : Inspect();
   }
@@ -51,7 +53,6 @@ class Precheck {
   // Finds the first controller that answers. It is asked everything that follows, so that no replication lag
   // between two of them can be seen.
   void Connect() {
-    step_ = "locate";
     std::string reasons;
     const auto controllers = request_.fields.value("controllers", std::vector<std::string>());
     for (size_t index = 0; index < controllers.size() && index < kMostControllers; ++index) {
@@ -69,14 +70,18 @@ class Precheck {
   }
 
   void CheckPassword() {
-    step_ = "password";
+    NextStep("password", controller_ + " answers");
     const std::string realm = UpperCase(request_.Text("dnsDomain"));
     DirectKerberosTo(realm, controller_);
-    LogOn(realm, SplitAccountName(request_.Text("user")), request_.secret);
+    try {
+      LogOn(realm, SplitAccountName(request_.Text("user")), request_.secret);
+    } catch (const Failure& failure) {
+      throw Failure(failure.Code(), request_.Text("user") + " was refused, tried once: " + failure.what());
+    }
   }
 
   void CheckClock() {
-    step_ = "clock";
+    NextStep("clock", "the password of " + request_.Text("user") + " is accepted");
     if (std::abs(offset_) <= kLargestSkew) return;
     throw Failure(kTimeSkew, controller_ + "'s clock differs from the host's by " + std::to_string(offset_) +
                                  " seconds; at most " + std::to_string(kLargestSkew) + " are allowed");
@@ -93,7 +98,7 @@ class Precheck {
       directory_->Delete(account.dn);
       text = "removed " + account.dn;
     }
-    return {{"status", kSuccess}, {"text", text}, {"step", step_}};
+    return {{"status", kSuccess}, {"text", text}};
   }
 
   nlohmann::json Inspect() {
@@ -117,30 +122,33 @@ class Precheck {
     throw Failure(kInvalidOrganizationalUnit, "the organisational unit " + dn + " does not exist");
   }
 
+  // Ends the present step with a text and begins another one.
+  void NextStep(const char* step, const std::string& text) {
+    done_.push_back({step_, text});
+    step_ = step;
+  }
+
   const Request& request_;
-  std::string step_ = "locate";
+  std::string step_ = "connect";
+  std::vector<std::pair<std::string, std::string>> done_;
   std::unique_ptr<Directory> directory_;
   RootEntry root_;
   std::string controller_;
   int64_t offset_ = 0;
 };
 
-nlohmann::json AnswerRequest() {
-  std::string step = "locate";
+nlohmann::json AnswerRequest(const Request& request) {
+  Precheck precheck(request);
+  nlohmann::json answer;
   try {
-    const Request request = ReceiveRequest();
-    Precheck precheck(request);
-    try {
-      return precheck.Answer();
-    } catch (...) {
-      step = precheck.Step();
-      throw;
-    }
+    answer = precheck.Answer();
   } catch (const Failure& failure) {
-    return {{"status", failure.Code()}, {"text", failure.what()}, {"step", step}};
+    answer = {{"status", failure.Code()}, {"text", failure.what()}};
   } catch (const std::exception& error) {
-    return {{"status", kInternalError}, {"text", error.what()}, {"step", step}};
+    answer = {{"status", kInternalError}, {"text", error.what()}};
   }
+  answer.update(precheck.Progress());
+  return answer;
 }
 
 }  // namespace
@@ -149,6 +157,11 @@ nlohmann::json AnswerRequest() {
 int main() {
   // A core file would hold the password.
   prctl(PR_SET_DUMPABLE, 0, 0, 0, 0);
-  sambaprovider::SendAnswer(sambaprovider::AnswerRequest());
+  try {
+    const sambaprovider::Request request = sambaprovider::ReceiveRequest();
+    sambaprovider::SendAnswer(sambaprovider::AnswerRequest(request));
+  } catch (const sambaprovider::Failure& failure) {
+    sambaprovider::SendAnswer({{"status", failure.Code()}, {"text", failure.what()}});
+  }
   return 0;
 }
