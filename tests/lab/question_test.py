@@ -1,7 +1,7 @@
 """Questions about a real domain, and each state of the trust with it produced for real."""
-from lab import LabTest
+import json
 
-HEALTHY, ACCOUNT_UNUSABLE, WRONG_PASSWORD, SERVICE_DOWN = 1, 3, 4, 8
+from lab import LabTest
 
 
 class StatusTest(LabTest):
@@ -11,8 +11,8 @@ class StatusTest(LabTest):
         status, exit_status = self.host.status()
         self.assertEqual(exit_status, 0)
         self.assertEqual(status["domain"]["dnsName"], "corp.example")
-        self.assertEqual(status["machineAccount"], f"CN={self.host.account},CN=Computers,DC=corp,DC=example")
-        self.assertEqual(status["domainController"], "dc1.corp.example")
+        self.assertEqual(status["domain"]["machineAccountDN"], f"CN={self.host.account},CN=Computers,DC=corp,DC=example")
+        self.assertEqual(status["domain"]["domainController"], "dc1.corp.example")
 
     def testStatusOfAHostThatIsNoMemberSaysSo(self):
         self.assertEqual(self.host.status()[1], 3)
@@ -26,19 +26,18 @@ class StatusTest(LabTest):
 
     def testTrustWithTheOtherForestIsTwoWay(self):
         self.host.must_join()
-        self.assertEqual(self.relationship("other.example"), 3)
+        self.assertEqual(self.relationship("other.example"), "two-way")
 
     def testOwnDomainIsTheSameDomain(self):
         self.host.must_join()
-        self.assertEqual(self.relationship("corp.example"), 1)
+        self.assertEqual(self.relationship("corp.example"), "same-domain")
 
     def testUnknownDomainIsNotTrusted(self):
         self.host.must_join()
-        self.assertEqual(self.relationship("nowhere.example"), 8)
+        self.assertEqual(self.relationship("nowhere.example"), "none")
 
     def relationship(self, domain):
-        with self.host.questioner(30) as store:
-            return int(store.ask(f"relationship {domain}").text)
+        return json.loads(self.host.must("velmorctl", "trust", "show", domain, "--json"))["relationship"]
 
     def testPreferredControllerIsRememberedAndUsed(self):
         self.host.must_join()
@@ -53,35 +52,35 @@ class TrustStateTest(LabTest):
         super().setUp()
         self.host.must_join()
 
-    def assert_state(self, state):
-        with self.host.questioner(60) as store:
-            self.assertEqual(int(store.ask("trust-state").text), state)
+    def assert_state(self, state, exit_status):
+        done = self.host.velmorctl("trust", "show", "--json")
+        self.assertEqual((json.loads(done.stdout)["state"], done.returncode), (state, exit_status))
 
     def testTrustIsHealthyAfterTheJoin(self):
-        self.assert_state(HEALTHY)
+        self.assert_state("healthy", 0)
 
     def testDisabledAccountIsUnusable(self):
         self.directory.disable_computer(self.host.account)
-        self.assert_state(ACCOUNT_UNUSABLE)
+        self.assert_state("account-unusable", 4)
 
     def testDeletedAccountIsUnusable(self):
         self.directory.delete_computer(self.host.account)
-        self.assert_state(ACCOUNT_UNUSABLE)
+        self.assert_state("account-unusable", 4)
 
     def testAccountWhosePasswordWasResetHasAnotherPassword(self):
         self.directory.reset_computer_password(self.host.account)
-        self.assert_state(WRONG_PASSWORD)
+        self.assert_state("wrong-password", 4)
 
     def testStoppedServiceIsDown(self):
         self.host.must("sh", "-c", "kill $(cat /run/samba/winbindd.pid); "
                        "while pgrep -x winbindd >/dev/null; do sleep 0.1; done")
-        self.assert_state(SERVICE_DOWN)
+        self.assert_state("service-down", 7)
 
-    def testBrokenTrustHasAnExitStatusOfItsOwn(self):
+    def testStatusEndsWithTheSameExitStatus(self):
         self.directory.disable_computer(self.host.account)
         self.assertEqual(self.host.status()[1], 4)
 
     def testAccountsNameIsStillKnownWhenItsPasswordWasReset(self):
         self.directory.reset_computer_password(self.host.account)
-        self.assertEqual(self.host.status()[0]["machineAccount"],
+        self.assertEqual(self.host.status()[0]["domain"]["machineAccountDN"],
                          f"CN={self.host.account},CN=Computers,DC=corp,DC=example")

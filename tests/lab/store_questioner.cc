@@ -1,5 +1,5 @@
-/// Asks a store with a time-out of its own, for the tests: reads one question per line, and answers each with a
-/// line of the milliseconds that it took and the answer.
+/// Asks a store with a time-out of its own, for the tests: reads one question per line, and answers each with
+/// a line of the milliseconds that it took and the answer.
 ///
 /// usage: store_questioner TIMEOUT_SECONDS
 ///   questions: "trust-state", "trusted-domains", "relationship DOMAIN", "configuration"
