@@ -1,8 +1,10 @@
 // How the hosts file is edited.
 #include "kernctl/hosts_file.h"
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <netdb.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -193,6 +195,25 @@ TEST(HostsFileTest, NothingHangsOnAPipe) {
   testsupport::RemoveFile(kFile);
   ASSERT_EQ(mkfifo(kFile.c_str(), 0644), 0);
   EXPECT_THROW_WHAT(HostsFile(), HostMgmtException, "Unable to read '/etc/hosts': it is not a regular file");
+}
+
+TEST(HostsFileTest, AnEditThatAnotherProcessHoldsUpIsReported) {
+  Add();
+  const int lock = open("/run/quenix/hosts.lock", O_RDWR | O_CLOEXEC);
+  ASSERT_EQ(flock(lock, LOCK_EX), 0);
+  HostsFile file;
+  EXPECT_THROW_WHAT(
+      file.AddOrReplaceEntry("10.0.0.6", "other", {}), HostMgmtException,
+      "Unable to change '/etc/hosts': cannot lock '/run/quenix/hosts.lock': another process has held "
+      "it for ten seconds");
+  close(lock);
+}
+
+TEST(HostsFileTest, NobodyElseCanHoldUpAnEdit) {
+  umask(0);
+  Add();
+  EXPECT_EQ(testsupport::ModeOf("/run/quenix/hosts.lock"), 0600U);
+  EXPECT_EQ(testsupport::ModeOf("/run/quenix"), 0755U);
 }
 
 TEST(HostsFileTest, NoEntryOfSeveralProcessesIsLost) {
