@@ -9,6 +9,11 @@ namespace {
 
 constexpr std::size_t RSA_BITS = 2048;
 
+EVP_PKEY* MakeKey(KeyKind kind) {
+  return kind == KeyKind::EC ? EVP_PKEY_Q_keygen(nullptr, nullptr, "EC", "P-256")
+                             : EVP_PKEY_Q_keygen(nullptr, nullptr, "RSA", RSA_BITS);
+}
+
 std::string Digest(X509* certificate, const EVP_MD* algorithm) {
   unsigned char digest[EVP_MAX_MD_SIZE];
   unsigned int size = 0;
@@ -25,8 +30,7 @@ std::string Digest(X509* certificate, const EVP_MD* algorithm) {
 }  // namespace
 
 Identity::Identity(KeyKind kind, std::chrono::hours start, std::chrono::hours end)
-    : key_(kind == KeyKind::EC ? EVP_EC_gen("P-256") : EVP_RSA_gen(RSA_BITS), EVP_PKEY_free),
-      certificate_(X509_new(), X509_free) {
+    : key_(MakeKey(kind), EVP_PKEY_free), certificate_(X509_new(), X509_free) {
   X509* certificate = certificate_.get();
   X509_set_version(certificate, X509_VERSION_3);
   ASN1_INTEGER_set(X509_get_serialNumber(certificate), 1);
