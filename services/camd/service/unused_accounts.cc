@@ -1,0 +1,53 @@
+#include "service/unused_accounts.h"
+
+#include <syslog.h>
+
+#include <ctime>
+
+#include "common/status.h"
+
+namespace camd {
+namespace {
+
+void Note(AuditLog& audit, const LedgerEntry& entry, const char* outcome, const std::string& text) {
+  audit.Write(
+      {{"event", "unused account"}, {"computer", entry.computer}, {"outcome", outcome}, {"text", text}});
+}
+
+// False when the directory does not answer, so that there is no use in going on.
+bool RemoveOne(const DirectorySettings& settings, const LedgerEntry& entry, Ledger& ledger,
+               DirectoryClient& directory, AuditLog& audit) {
+  try {
+    directory.RemoveUnusedAccount(settings, entry);
+    ledger.MarkRemoved(entry.id, time(nullptr));
+    Note(audit, entry, "removed", "");
+  } catch (const Failure& failure) {
+    if (failure.Code() == kNotFound) {
+      ledger.MarkRemoved(entry.id, time(nullptr));
+    } else if (failure.Code() == kAccountInUse) {
+      ledger.MarkKept(entry.id, time(nullptr));
+    } else {
+      Note(audit, entry, "not looked at", failure.what());
+      return failure.Code() == kAccessDenied;
+    }
+    Note(audit, entry, "kept", failure.what());
+  }
+  return true;
+}
+
+}  // namespace
+
+void RemoveUnusedAccounts(const DirectorySettings& settings, Ledger& ledger, DirectoryClient& directory,
+                          AuditLog& audit) {
+  if (settings.removeUnusedAfter.count() == 0) return;
+  try {
+    const int64_t age = std::chrono::seconds(settings.removeUnusedAfter).count();
+    for (const LedgerEntry& entry : ledger.FindOlderThan(time(nullptr) - age)) {
+      if (!RemoveOne(settings, entry, ledger, directory, audit)) return;
+    }
+  } catch (const DatabaseError& error) {
+    syslog(LOG_ERR, "unused accounts were not looked for: %s", error.what());
+  }
+}
+
+}  // namespace camd
