@@ -22,6 +22,8 @@ class SYSTEMCONFIGURATION_EXPORT PAMEntry {
   /// No parameters.
   PAMEntry(PAMControl control, std::string module);
 
+  const PAMControl& control() const;
+
   /// The module's path or name as written.
   const std::string& module() const;
 
@@ -34,7 +36,6 @@ class SYSTEMCONFIGURATION_EXPORT PAMEntry {
   bool operator==(const PAMEntry& other) const;
 
  private:
-  friend SYSTEMCONFIGURATION_EXPORT std::ostream& operator<<(std::ostream& stream, const PAMEntry& entry);
   friend SYSTEMCONFIGURATION_EXPORT std::istream& operator>>(std::istream& stream, PAMEntry& entry);
 
   PAMControl control_;

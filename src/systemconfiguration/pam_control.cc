@@ -3,24 +3,17 @@
 #include <optional>
 #include <string_view>
 
-#include "keyword_table.h"
+#include "pam_keywords.h"
 #include "systemconfiguration/exceptions.h"
 
 namespace SystemConfiguration {
 namespace {
 
-constexpr KeywordTable<PAMControl::Control, 6> keywords = {{{PAMControl::Required, "required"},
-                                                            {PAMControl::Requisite, "requisite"},
-                                                            {PAMControl::Sufficient, "sufficient"},
-                                                            {PAMControl::Optional, "optional"},
-                                                            {PAMControl::Include, "include"},
-                                                            {PAMControl::Substack, "substack"}}};
-
 constexpr std::string_view messagePrefix = "Invalid Control: ";
 
 PAMControl::Control ControlOf(const std::string& text) {
   if (!text.empty() && text.front() == '[' && text.back() == ']') return PAMControl::Bracketed;
-  if (const std::optional<PAMControl::Control> value = FindValue(keywords, text)) return *value;
+  if (const std::optional<PAMControl::Control> value = FindValue(controlKeywords, text)) return *value;
   throw InvalidControlException(MessageForUnknown(messagePrefix, text));
 }
 
@@ -62,7 +55,7 @@ bool PAMControl::operator==(const std::string& text) const {
 
 PAMControl::operator std::string() const {
   if (value_ == Bracketed) return text_;
-  if (const std::optional<std::string_view> keyword = FindText(keywords, value_)) {
+  if (const std::optional<std::string_view> keyword = FindText(controlKeywords, value_)) {
     return std::string(*keyword);
   }
   throw InvalidControlException(MessageWithoutKeyword(messagePrefix, value_));

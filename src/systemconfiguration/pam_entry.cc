@@ -33,6 +33,10 @@ PAMEntry::PAMEntry() = default;
 PAMEntry::PAMEntry(PAMControl control, std::string module)
     : control_(std::move(control)), module_(std::move(module)) {}
 
+const PAMControl& PAMEntry::control() const {
+  return control_;
+}
+
 const std::string& PAMEntry::module() const {
   return module_;
 }
@@ -52,8 +56,8 @@ bool PAMEntry::operator==(const PAMEntry& other) const {
 }
 
 std::ostream& operator<<(std::ostream& stream, const PAMEntry& entry) {
-  stream << static_cast<std::string>(entry.control_) << '\t' << entry.module_ << '\t';
-  for (const std::string& parameter : entry.parameters_) stream << parameter << ' ';
+  stream << static_cast<std::string>(entry.control()) << '\t' << entry.module() << '\t';
+  for (const std::string& parameter : entry.parameters()) stream << parameter << ' ';
   return stream;
 }
 

@@ -5,21 +5,16 @@
 #include <ostream>
 #include <string_view>
 
-#include "keyword_table.h"
+#include "pam_keywords.h"
 #include "systemconfiguration/exceptions.h"
 
 namespace SystemConfiguration {
 namespace {
 
-constexpr KeywordTable<PAMFacility::Facility, 4> keywords = {{{PAMFacility::Auth, "auth"},
-                                                              {PAMFacility::Account, "account"},
-                                                              {PAMFacility::Password, "password"},
-                                                              {PAMFacility::Session, "session"}}};
-
 constexpr std::string_view messagePrefix = "Invalid Facility: ";
 
 PAMFacility::Facility FacilityOf(const std::string& word) {
-  if (const std::optional<PAMFacility::Facility> value = FindValue(keywords, word)) return *value;
+  if (const std::optional<PAMFacility::Facility> value = FindValue(facilityKeywords, word)) return *value;
   throw InvalidFacilityException(MessageForUnknown(messagePrefix, word));
 }
 
@@ -54,7 +49,7 @@ bool PAMFacility::operator==(const std::string& word) const {
 }
 
 PAMFacility::operator std::string() const {
-  if (const std::optional<std::string_view> keyword = FindText(keywords, value_)) {
+  if (const std::optional<std::string_view> keyword = FindText(facilityKeywords, value_)) {
     return std::string(*keyword);
   }
   throw InvalidFacilityException(MessageWithoutKeyword(messagePrefix, value_));

@@ -4,7 +4,11 @@
 #include <istream>
 #include <limits>
 #include <ostream>
+#include <string_view>
 #include <utility>
+
+#include "buffered_input.h"
+#include "pam_line_reader.h"
 
 namespace SystemConfiguration {
 namespace {
@@ -23,6 +27,11 @@ Traits::int_type PeekBehindWhiteSpace(std::istream& stream) {
 
 void SkipLine(std::istream& stream) {
   stream.ignore(std::numeric_limits<std::streamsize>::max(), '\n');
+}
+
+// The common case of ReadLine, many times over.
+void ReadBufferedLines(BufferedInput& input, PAMLineReader& lines) {
+  for (std::string_view line = input.Line(); lines.Append(line); line = input.Line()) input.Consume(line);
 }
 
 void ReadLine(std::istream& stream, PAMPolicy& policy) {
@@ -51,7 +60,10 @@ std::ostream& operator<<(std::ostream& stream, const PAMPolicy& policy) {
 }
 
 std::istream& operator>>(std::istream& stream, PAMPolicy& policy) {
+  BufferedInput input(stream);
+  PAMLineReader lines(policy);
   while (!stream.fail()) {
+    ReadBufferedLines(input, lines);
     const Traits::int_type next = PeekBehindWhiteSpace(stream);
     if (Traits::eq_int_type(next, Traits::eof())) break;
     if (next == '#') {

@@ -3,7 +3,29 @@
 #include <algorithm>
 #include <ostream>
 
+#include "systemconfiguration/exceptions.h"
+
 namespace SystemConfiguration {
+namespace {
+
+// The same as writing facility, entry and line end one after the other, at a fraction of the cost. Only the
+// first word goes through the stream by itself: the stream's width is meant for it.
+void WriteLine(std::ostream& stream, const std::string& facility, const PAMEntry& entry, std::string& rest) {
+  stream << facility;
+  rest.assign(1, '\t');
+  try {
+    rest.append(static_cast<std::string>(entry.control()));
+  } catch (const InvalidControlException&) {
+    stream << rest;
+    throw;
+  }
+  rest.append(1, '\t').append(entry.module()).append(1, '\t');
+  for (const std::string& parameter : entry.parameters()) rest.append(parameter).append(1, ' ');
+  rest.append(1, '\n');
+  stream.write(rest.data(), static_cast<std::streamsize>(rest.size())).flush();
+}
+
+}  // namespace
 
 PAMStack::PAMStack() = default;
 
@@ -22,7 +44,10 @@ PAMStack::const_iterator PAMStack::find(const std::string& module) const {
 }
 
 std::ostream& operator<<(std::ostream& stream, const PAMStack& stack) {
-  for (const PAMEntry& entry : stack) stream << stack.Facility() << '\t' << entry << std::endl;
+  if (stack.empty()) return stream;
+  const std::string facility = stack.Facility();
+  std::string rest;
+  for (const PAMEntry& entry : stack) WriteLine(stream, facility, entry, rest);
   return stream;
 }
 

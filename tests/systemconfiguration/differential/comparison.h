@@ -16,7 +16,7 @@ namespace differential {
 /// `read` is called with the stream.
 template <class Read>
 std::string ObserveReading(const InputCase& input, const Read& read) {
-  constexpr int readings = 3;
+  constexpr int readings = 2;
   SourceBuffer buffer(input);
   std::istream stream(&buffer);
   SetUp(stream, input);

@@ -29,7 +29,6 @@ InputCase FromBytes(const std::uint8_t* bytes, std::size_t size) {
   input.commaSeparates = (setUp(0) & 16U) != 0;
   input.state = StateOf(setUp(0) >> 5U);
   input.exceptions = StateOf(setUp(1));
-  input.flushAlways = (setUp(1) & 8U) != 0;
   input.throwWhenFull = (setUp(1) & 16U) != 0;
   input.chunk = setUp(2);
   if (setUp(3) != 0) input.fault = (setUp(3) - 1) * input.text.size() / 255;
@@ -39,10 +38,9 @@ InputCase FromBytes(const std::uint8_t* bytes, std::size_t size) {
 
 std::ostream& operator<<(std::ostream& stream, const InputCase& input) {
   return stream << "width " << input.width << ", skipws " << input.skipWhiteSpace << ", comma "
-                << input.commaSeparates << ", unitbuf " << input.flushAlways << ", state " << input.state
-                << ", exceptions " << input.exceptions << ", chunk " << input.chunk << ", fault "
-                << input.fault << ", capacity " << input.capacity << ", throws " << input.throwWhenFull
-                << "\ntext: " << Escaped(input.text) << "\n";
+                << input.commaSeparates << ", state " << input.state << ", exceptions " << input.exceptions
+                << ", chunk " << input.chunk << ", fault " << input.fault << ", capacity " << input.capacity
+                << ", throws " << input.throwWhenFull << "\ntext: " << Escaped(input.text) << "\n";
 }
 
 }  // namespace differential

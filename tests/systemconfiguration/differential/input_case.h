@@ -14,7 +14,6 @@ struct InputCase {
   std::streamsize width = 0;
   bool skipWhiteSpace = true;
   bool commaSeparates = false;  // a locale whose white space is the comma and the line end
-  bool flushAlways = false;
   std::ios_base::iostate state = std::ios_base::goodbit;       // before the first operation
   std::ios_base::iostate exceptions = std::ios_base::goodbit;  // the stream's exception mask
   std::size_t chunk = 0;                                       // characters per refill; 0: all at once

@@ -71,7 +71,6 @@ void SetUp(std::ios& stream, const InputCase& input) {
   stream.width(input.width);
   stream.setf(input.skipWhiteSpace ? std::ios_base::skipws : std::ios_base::fmtflags{},
               std::ios_base::skipws);
-  if (input.flushAlways) stream.setf(std::ios_base::unitbuf);
   stream.clear(input.state);
   try {
     stream.exceptions(input.exceptions);
