@@ -1,4 +1,4 @@
-/* Hangs when it is asked for trusted domains, until hangsRelease() is called. */
+/* Hangs when it is asked for the joined domain or for the trusted ones, until hangsRelease() is called. */
 #include <pthread.h>
 
 #include "authentication/plugin/active_directory_client.h"
@@ -31,7 +31,7 @@ static void keep(void* memory) {
   (void)memory;
 }
 
-static uint32_t getTrustedDomains(ActiveDirectoryDomainPair*** domains, ActiveDirectoryFree* release) {
+static void hang(void) {
   pthread_mutex_lock(&mutex);
   called = 1;
   pthread_cond_broadcast(&changed);
@@ -39,10 +39,22 @@ static uint32_t getTrustedDomains(ActiveDirectoryDomainPair*** domains, ActiveDi
     pthread_cond_wait(&changed, &mutex);
   }
   pthread_mutex_unlock(&mutex);
+}
+
+static uint32_t getActiveDomain(ActiveDirectoryDomainPair* domain, ActiveDirectoryFree* release) {
+  hang();
+  domain->dnsName = 0;
+  *release = keep;
+  return 0;
+}
+
+static uint32_t getTrustedDomains(ActiveDirectoryDomainPair*** domains, ActiveDirectoryFree* release) {
+  hang();
   *domains = 0;
   *release = keep;
   return 0;
 }
 
+#define GET_ACTIVE_DOMAIN getActiveDomain
 #define GET_TRUSTED_DOMAINS getTrustedDomains
 #include "plugins/table.h"

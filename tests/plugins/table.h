@@ -20,6 +20,9 @@
 #ifndef NSS_PARAMETERS
 #define NSS_PARAMETERS "nss_first"
 #endif
+#ifndef GET_ACTIVE_DOMAIN
+#define GET_ACTIVE_DOMAIN 0
+#endif
 #ifndef GET_TRUSTED_DOMAINS
 #define GET_TRUSTED_DOMAINS 0
 #endif
@@ -35,6 +38,7 @@ const struct ActiveDirectoryClientMetadata ActiveDirectoryClientMetadata = {
 
 const struct ActiveDirectoryClientOperations ActiveDirectoryClientOperations = {
     .apiVersion = TABLE_VERSION,
+    .getActiveDomain = GET_ACTIVE_DOMAIN,
     .getTrustedDomains = GET_TRUSTED_DOMAINS,
     .joinDomainWithMachineAccount = JOIN_DOMAIN_WITH_MACHINE_ACCOUNT,
     .getHostPrincipalForDomain = GET_HOST_PRINCIPAL_FOR_DOMAIN,
