@@ -153,9 +153,9 @@ TEST(CamVerificationTest, ServerOfTls11IsReal) {
   const std::unique_ptr<SSL_CTX, void (*)(SSL_CTX*)> context(SSL_CTX_new(TLS_client_method()), SSL_CTX_free);
   SSL_CTX_set_min_proto_version(context.get(), TLS1_1_VERSION);
   SSL_CTX_set_cipher_list(context.get(), "DEFAULT@SECLEVEL=0");
-  const std::string target = LOOPBACK + ":" + std::to_string(server.Port());
+  std::string target = LOOPBACK + ":" + std::to_string(server.Port());
   const std::unique_ptr<BIO, void (*)(BIO*)> client(BIO_new_ssl_connect(context.get()), BIO_free_all);
-  BIO_set_conn_hostname(client.get(), target.c_str());
+  BIO_set_conn_hostname(client.get(), target.data());
   EXPECT_EQ(BIO_do_handshake(client.get()), 1);
 }
 
