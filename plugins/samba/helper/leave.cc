@@ -12,8 +12,8 @@
 namespace sambaprovider {
 namespace {
 
-// A wrong password is found out here, with its reason and with one attempt. Returns whether the directory still
-// has the computer account.
+// A wrong password is found out here, with its reason and with one attempt. Returns whether the directory
+// still has the computer account.
 bool CheckCredentials(const Call& call, const State& state, const std::string& user) {
   if (SplitAccountName(user).user.empty()) throw Failure(kInvalidAccountName, "the user name is empty");
   std::vector<std::string> controllers = state.preferredDomainControllers;
