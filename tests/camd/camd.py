@@ -74,6 +74,18 @@ def is_closed(connection, limit=20):
         return True
 
 
+def status_of_next(connection):
+    """Reads one answer of an open connection; returns its HTTP status, or None when there is none."""
+    connection.settimeout(20)
+    answer = http.client.HTTPResponse(connection)
+    try:
+        answer.begin()
+    except http.client.BadStatusLine:
+        return None
+    answer.read()
+    return answer.status
+
+
 def raw(text, limit=20):
     """Sends bytes as they are; returns what comes back until the end of the connection."""
     with connect() as connection:
