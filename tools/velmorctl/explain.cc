@@ -11,6 +11,7 @@
 #include "hostmgmt/host_management_exception.h"
 #include "meanings.h"
 #include "plugin_file.h"
+#include "proxy_meanings.h"
 #include "settings_file.h"
 #include "text.h"
 
@@ -68,7 +69,8 @@ std::optional<FileProblem> ProblemBehind(const Meaning& meaning) {
 
 Failure ExplainException(const Exception& exception, const Situation& situation,
                          const std::string& happened) {
-  const Meaning& meaning = MeaningOf(exception);
+  const bool byProxy = situation.throughProxy && situation.providerReason.empty();
+  const Meaning& meaning = byProxy ? ProxyMeaningOf(exception) : MeaningOf(exception);
   if (meaning.missingOperation) {
     return WithoutOperation(Failure(meaning.code, happened).Try(meaning.advice));
   }
