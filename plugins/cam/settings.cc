@@ -68,11 +68,6 @@ class SettingsFile {
 
 }  // namespace
 
-std::optional<Sha256> Settings::Sha256For(const std::string& server) const {
-  const auto own = sha256OfServer.find(server);
-  return own != sha256OfServer.end() ? own->second : sha256;
-}
-
 Settings LoadSettings() {
   const SettingsFile file;
   if (!file.Exists()) return {};

@@ -67,21 +67,18 @@ class Parser {
     } else if (key == "token") {
       if (!IsToken(value)) Refuse("needs a token of printable characters without blanks");
       settings_.token = value;
-    } else if (key == "sha256") {
-      settings_.sha256 = Digest(value);
     } else if (key.starts_with(SHA256_PREFIX)) {
-      const std::string server = key.substr(SHA256_PREFIX.size());
-      if (!IsAddress(server)) Refuse("needs an IPv4 address behind \"sha256-\"");
-      settings_.sha256OfServer[server] = Digest(value);
+      SetSha256(key.substr(SHA256_PREFIX.size()), value);
     } else {
       Refuse("has the unknown key '" + key + "'");
     }
   }
 
-  Sha256 Digest(std::string_view value) const {
+  void SetSha256(const std::string& server, std::string_view value) {
     const auto digest = ParseSha256(value);
+    if (!IsAddress(server)) Refuse("needs an IPv4 address behind \"sha256-\"");
     if (!digest) Refuse("needs a SHA-256 of 64 hexadecimal digits");
-    return *digest;
+    settings_.sha256OfServer[server] = *digest;
   }
 
   int Number(std::string_view value, int least, int most) const {

@@ -16,8 +16,7 @@ constexpr AddCommand commands[] = {AddStatusCommand,
                                    AddProviderCommand,
                                    AddDomainControllerCommand,
                                    AddSmartCardCommand,
-                                   AddOptionCommand,
-                                   AddCamCommand};
+                                   AddOptionCommand};
 
 }  // namespace
 

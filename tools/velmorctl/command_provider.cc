@@ -59,7 +59,12 @@ ExitCode List(const Options& options, Situation&) {
 }
 
 std::string OperationsText(const PluginDescription& plugin) {
-  std::vector<std::string> missing = MissingOperations(plugin);
+  std::vector<std::string> missing;
+  for (const auto& [name, present] : plugin.operations) {
+    if (!present) {
+      missing.push_back(name);
+    }
+  }
   return missing.empty() ? "all" : "all but " + Join(missing, ", ");
 }
 
