@@ -1,11 +1,11 @@
 #include "systemconfiguration/nss_configuration.h"
 
 #include <istream>
+#include <list>
 #include <optional>
 #include <ostream>
 #include <string>
 #include <string_view>
-#include <utility>
 
 #include "nss_database_keywords.h"
 #include "words.h"
@@ -15,51 +15,47 @@ namespace {
 
 constexpr std::string_view trimmedCharacters = " \t\r\n";
 
-// Reads one line, which has no leading white space.
+// Takes apart one line, which has no leading white space.
 class NSSLineReader {
  public:
   NSSLineReader(const std::string& line, const WhiteSpace& whiteSpace)
       : line_(line), whiteSpace_(whiteSpace), words_(line, whiteSpace) {}
 
   // The first word without its last character, which is not looked at.
-  std::optional<NSSDatabase> ReadDatabase() {
+  std::optional<NSSDatabase::Database> TakeDatabase() {
     std::string_view word = words_.Next();
     word.remove_suffix(word.empty() ? 0 : 1);
-    if (const auto value = FindValue(databaseKeywords, word)) return NSSDatabase(*value);
-    return std::nullopt;
+    return FindValue(databaseKeywords, word);
   }
 
   // Empty at the end of the line.
-  std::optional<NSSService> ReadService() {
-    const std::string_view word = words_.Next();
-    if (word.empty()) return std::nullopt;
-    NSSService service{std::string(word)};
-    if (words_.Position() < line_.size()) ReadCriterion(service);
-    return service;
+  std::string_view TakeModule() { return words_.Next(); }
+
+  // Whether a criterion follows the module just taken.
+  // Throws std::out_of_range when the line ends with the one character behind the module.
+  bool HasCriterion() const {
+    return words_.Position() < line_.size() && line_.at(words_.Position() + 1) == '[';
+  }
+
+  void AppendCriterion(std::list<std::string>& parameters) const {
+    const std::size_t begin = words_.Position() + 2;
+    const std::size_t end = line_.find(']', begin);
+    const std::size_t length = end == std::string::npos ? end : end - begin;
+    AppendWords(std::string_view(line_).substr(begin, length), whiteSpace_, parameters);
+  }
+
+  // Deliberate: the index behind the separator is added to the bracket's own, which leads far behind the
+  // bracket, mostly out of the line.
+  void SkipBehindBracket() {
+    if (!bracketAhead_ || words_.Position() >= line_.size()) return;
+    const std::size_t next = words_.Position() + 1;
+    const std::size_t closing = line_.find(']', next);
+    // Remembered, lest a long line without brackets be searched again for each service.
+    bracketAhead_ = closing != std::string::npos;
+    if (bracketAhead_) words_.MoveTo(next + closing);
   }
 
  private:
-  // Throws std::out_of_range when the line ends with the one character behind the service.
-  void ReadCriterion(NSSService& service) {
-    const std::size_t next = words_.Position() + 1;
-    const bool hasCriterion = line_.at(next) == '[';
-    const std::size_t closing = FindClosingBracket(next);
-    if (hasCriterion) {
-      const std::size_t length = closing == std::string::npos ? closing : closing - next - 1;
-      AppendWords(std::string_view(line_).substr(next + 1, length), whiteSpace_, service.parameters());
-    }
-    // Deliberate: an index is added to an index, which leads far behind the bracket, mostly out of the line.
-    if (closing != std::string::npos) words_.MoveTo(next + closing);
-  }
-
-  // Remembers that there is none left, lest a long line without brackets be searched again for each service.
-  std::size_t FindClosingBracket(std::size_t from) {
-    if (!bracketAhead_) return std::string::npos;
-    const std::size_t found = line_.find(']', from);
-    bracketAhead_ = found != std::string::npos;
-    return found;
-  }
-
   const std::string& line_;
   const WhiteSpace& whiteSpace_;
   WordReader words_;
@@ -68,10 +64,15 @@ class NSSLineReader {
 
 void ReadLine(const std::string& line, const WhiteSpace& whiteSpace, NSSConfiguration& configuration) {
   NSSLineReader reader(line, whiteSpace);
-  const std::optional<NSSDatabase> database = reader.ReadDatabase();
+  const std::optional<NSSDatabase::Database> database = reader.TakeDatabase();
   if (!database) return;
-  while (std::optional<NSSService> service = reader.ReadService()) {
-    configuration[*database].push_back(std::move(*service));
+  std::deque<NSSService>* services = nullptr;  // looked up, and perhaps made, for the first service
+  for (std::string_view module = reader.TakeModule(); !module.empty(); module = reader.TakeModule()) {
+    const bool hasCriterion = reader.HasCriterion();
+    if (services == nullptr) services = &configuration[*database];
+    NSSService& service = services->emplace_back(std::string(module));
+    if (hasCriterion) reader.AppendCriterion(service.parameters());
+    reader.SkipBehindBracket();
   }
 }
 

@@ -74,12 +74,13 @@ TEST(PolicyStreamTest, AFailedStreamIsLeftAlone) {
   }
 }
 
-TEST(PolicyStreamTest, AStreamAtItsEndFails) {
+TEST(PolicyStreamTest, AStreamAtItsEndFailsWithoutBeingRead) {
   std::istringstream stream("auth required m\n");
   stream.clear(std::ios_base::eofbit);
   PAMPolicy policy("test");
   stream >> policy;
   EXPECT_EQ(stream.rdstate(), eofAndFail);
+  EXPECT_TRUE(policy[PAMFacility::Auth].empty());
 }
 
 TEST(PolicyStreamTest, AWidthCutsTheFirstWordOnly) {

@@ -27,6 +27,8 @@ class CommaClassification : public std::ctype<char> {
 
 SourceBuffer::SourceBuffer(const InputCase& input) : input_(input), text_(input.text) {
   setg(text_.data(), text_.data(), text_.data());
+  const bool isFilledAtOnce = input.chunk == 0 && input.fault == std::string::npos;
+  if (isFilledAtOnce) underflow();
 }
 
 std::size_t SourceBuffer::Consumed() const {
