@@ -50,7 +50,10 @@ std::string FormatSmbConf(const State& state, const Settings& settings, KeytabUs
     text << "  kerberos method = secrets and keytab\n"
          << "  dedicated keytab file = " << paths::kKeytab << "\n";
   }
-  text << "  winbind request timeout = " << settings.winbindRequestTimeout.count() << "\n"
+  text << "  winbind request timeout = " << settings.winbindRequestTimeout.count()
+       << "\n"
+       // winbindd would change the password and forget the keytab; the provider changes both together.
+       << "  machine password timeout = 0\n"
        << "  winbind scan trusted domains = yes\n"
        << "  winbind use default domain = no\n"
        << "  winbind refresh tickets = yes\n"

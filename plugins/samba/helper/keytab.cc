@@ -21,6 +21,8 @@ namespace {
 
 constexpr const char* kNet = "/usr/bin/net";
 constexpr std::chrono::seconds kLimit{30};
+// As long as winbindd would wait, were it allowed to change the password by itself.
+constexpr std::chrono::hours kLongestPasswordAge{7 * 24};
 
 std::string RunNet(const std::vector<std::string>& arguments) {
   std::vector<std::string> command = {kNet, "ads", "--machine-pass"};
@@ -42,6 +44,24 @@ void TouchKeytab() {
   utimensat(AT_FDCWD, paths::kKeytab, nullptr, 0);
 }
 
+void RefreshKeytab(const Call& call, int64_t passwordTime) {
+  const auto keytabTime = KeytabTime();
+  const auto age = std::chrono::seconds(time(nullptr) - passwordTime);
+  if (!keytabTime || passwordTime >= *keytabTime) {
+    call.log.Run("keytab", "the machine's password is newer than the keytab: making it anew", [] {
+      MakeKeytab();
+      return "made";
+    });
+  } else if (passwordTime != 0 && age > kLongestPasswordAge) {
+    call.log.Run("keytab", "the machine's password is a week old: changing it and the keytab", [] {
+      RunNet({"changetrustpw"});
+      return "changed";
+    });
+  } else {
+    TouchKeytab();
+  }
+}
+
 }  // namespace
 
 void MakeKeytab() {
@@ -60,16 +80,7 @@ std::string FindMachineAccountDn(const std::string& computer) {
 std::string Refresh(const Call& call) {
   State state = LoadState();
   if (!state.joined) return "the host has joined no domain";
-  const auto passwordTime = MachinePasswordTime(state.netbiosDomain);
-  const auto keytabTime = KeytabTime();
-  if (!keytabTime || (passwordTime && *passwordTime >= *keytabTime)) {
-    call.log.Run("keytab", "the machine's password is newer than the keytab: making it anew", [] {
-      MakeKeytab();
-      return "made";
-    });
-  } else {
-    TouchKeytab();
-  }
+  RefreshKeytab(call, MachinePasswordTime(state.netbiosDomain).value_or(0));
   if (state.machineAccountDn.empty()) {
     call.log.Run("account", "asking for the machine account's name", [&] {
       state.machineAccountDn = FindMachineAccountDn(state.hostName);

@@ -27,9 +27,8 @@ std::optional<int64_t> MachinePasswordTime(const std::string& netbiosDomain) {
       tdb_open(paths::kSecrets, 0, TDB_DEFAULT, O_RDONLY | O_CLOEXEC, 0600));
   if (database == nullptr) return std::nullopt;
   std::string key = "SECRETS/MACHINE_LAST_CHANGE_TIME/" + UpperCase(netbiosDomain);
-  // Samba's keys include the terminator.
   const TDB_DATA found =
-      tdb_fetch(database.get(), TDB_DATA{reinterpret_cast<unsigned char*>(key.data()), key.size() + 1});
+      tdb_fetch(database.get(), TDB_DATA{reinterpret_cast<unsigned char*>(key.data()), key.size()});
   const std::unique_ptr<unsigned char, decltype(&free)> value(found.dptr, free);
   if (found.dsize != 4) return std::nullopt;
   int64_t seconds = 0;

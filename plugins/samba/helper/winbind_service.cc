@@ -129,6 +129,8 @@ bool IsRunning() {
 
 void Start() {
   if (SystemdRuns()) {
+    // Several joins and leaves in a row are no reason to refuse the next start.
+    SystemCtl({"reset-failed"}, kStartTime);
     SystemCtl({"start"}, kStartTime);
   } else {
     StartDirectly();

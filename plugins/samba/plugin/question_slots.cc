@@ -2,6 +2,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <ctime>
+
 #include "common/names.h"
 #include "common/paths.h"
 #include "common/state.h"
@@ -14,6 +16,8 @@
 
 namespace sambaprovider::slots {
 namespace {
+
+constexpr time_t kKeytabRest = 24 * 60 * 60;
 
 bool IsDomain(const std::string& asked, const std::string& dnsName, const std::string& netbiosName) {
   return EqualWithoutCase(asked, dnsName) || EqualWithoutCase(asked, netbiosName);
@@ -34,10 +38,16 @@ bool IsNewer(const timespec& left, const timespec& right) {
   return left.tv_sec != right.tv_sec ? left.tv_sec > right.tv_sec : left.tv_nsec > right.tv_nsec;
 }
 
-// winbindd changes the machine's password now and then and does not think of the keytab. Its secrets file is
-// then newer than the keytab, and the helper looks more closely.
+// Somebody may have changed the machine's password without thinking of the keytab: Samba's secrets are then
+// newer than the keytab. Once a day the helper looks in any case, since the password has to be changed in
+// time.
+bool KeytabNeedsALook() {
+  const timespec keytab = ChangeTime(paths::kKeytab);
+  return IsNewer(ChangeTime(paths::kSecrets), keytab) || time(nullptr) - keytab.tv_sec > kKeytabRest;
+}
+
 void KeepKeytabInStep() {
-  if (geteuid() != 0 || !IsNewer(ChangeTime(paths::kSecrets), ChangeTime(paths::kKeytab))) return;
+  if (geteuid() != 0 || !KeytabNeedsALook()) return;
   // A failure is in the record of attempts; the trust itself is healthy.
   Guarded([] {
     Request request;

@@ -1,0 +1,140 @@
+// What the next run makes of an operation that was killed.
+
+#include <fcntl.h>
+#include <gtest/gtest.h>
+#include <sys/stat.h>
+extern "C" {
+#include <tdb.h>
+}
+
+#include "common/attempt_log.h"
+#include "common/paths.h"
+#include "common/state.h"
+#include "helper/before_join.h"
+#include "helper/journal.h"
+#include "helper/operations.h"
+#include "support/files.h"
+
+namespace sambaprovider {
+namespace {
+
+class RecoverTest : public testing::Test {
+ protected:
+  RecoverTest() {
+    testsupport::MakeFolders("/var/lib/quenix/samba");
+    testsupport::MakeFolders("/etc/samba");
+    samba_ = std::make_unique<testsupport::SmallFileSystem>("/etc/samba", 65536);
+    if (testsupport::Exists(paths::kKeytab)) testsupport::RemoveFile(paths::kKeytab);
+    testsupport::WriteFile(paths::kSmbConf, "before");
+    request_.fields = {{"operation", "join"}};
+  }
+
+  void SaveJoined() {
+    State state;
+    state.joined = true;
+    state.dnsDomain = "corp.example";
+    state.netbiosDomain = "CORP";
+    state.hostName = "SANDBOX";
+    state.smartCardEnabledServices = {"sshd"};
+    SaveState(state);
+  }
+
+  void StoreMachinePassword() {
+    testsupport::MakeFolders("/var/lib/samba/private");
+    tdb_context* const database = tdb_open(paths::kSecrets, 0, TDB_DEFAULT, O_RDWR | O_CREAT, 0600);
+    ASSERT_NE(database, nullptr);
+    std::string key = "SECRETS/MACHINE_LAST_CHANGE_TIME/CORP";
+    std::string time = "abcd";
+    tdb_store(database, {reinterpret_cast<unsigned char*>(key.data()), key.size()},
+              {reinterpret_cast<unsigned char*>(time.data()), time.size()}, TDB_REPLACE);
+    tdb_close(database);
+  }
+
+  std::string RunRecover() { return Recover({log_, settings_, request_}); }
+
+  std::unique_ptr<testsupport::SmallFileSystem> samba_;
+  const AttemptLog log_{1, "join"};
+  const Settings settings_;
+  Request request_;
+};
+
+TEST_F(RecoverTest, WithoutAJournalNothingHappens) {
+  EXPECT_EQ(RunRecover(), "nothing was interrupted");
+  EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "before");
+}
+
+TEST_F(RecoverTest, AnInterruptedJoinIsTakenBack) {
+  before_join::PutAside();
+  SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", true});
+  // Killed between remembering what it writes to smb.conf and writing it.
+  testsupport::WriteFile(paths::kWrittenSmbConf, "ours");
+  testsupport::RemoveFile(paths::kSmbConf);
+  testsupport::WriteFile(paths::kKeytab, "new");
+  RunRecover();
+  EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "before");
+  EXPECT_FALSE(testsupport::Exists(paths::kKeytab));
+  EXPECT_FALSE(testsupport::Exists(paths::kJournal));
+  EXPECT_FALSE(testsupport::Exists(paths::kBeforeFolder));
+}
+
+TEST_F(RecoverTest, AJoinThatHadRememberedItsDomainIsKept) {
+  before_join::PutAside();
+  SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", true});
+  SaveJoined();
+  RunRecover();
+  EXPECT_TRUE(LoadState().joined);
+  EXPECT_FALSE(testsupport::Exists(paths::kJournal));
+  EXPECT_TRUE(testsupport::Exists(paths::kBeforeFolder));
+}
+
+TEST_F(RecoverTest, ALeaveWhoseSecretsAreGoneIsFinished) {
+  before_join::PutAside();
+  testsupport::WriteFile(paths::kWrittenSmbConf, "ours");
+  testsupport::WriteFile(paths::kSmbConf, "ours");
+  SaveJoined();
+  SaveJournal({Journal::Operation::kLeave, "corp.example", "CORP", "SANDBOX", false});
+  RunRecover();
+  EXPECT_FALSE(LoadState().joined);
+  EXPECT_EQ(LoadState().dnsDomain, "");
+  EXPECT_EQ(LoadState().smartCardEnabledServices, std::vector<std::string>{"sshd"});
+  EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "before");
+  EXPECT_FALSE(testsupport::Exists(paths::kJournal));
+}
+
+TEST_F(RecoverTest, ALeaveThatHadRemovedNothingYetIsForgotten) {
+  before_join::PutAside();
+  testsupport::WriteFile(paths::kWrittenSmbConf, "ours");
+  testsupport::WriteFile(paths::kSmbConf, "ours");
+  SaveJoined();
+  StoreMachinePassword();
+  SaveJournal({Journal::Operation::kLeave, "corp.example", "CORP", "SANDBOX", false});
+  RunRecover();
+  EXPECT_TRUE(LoadState().joined);
+  EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "ours");
+  EXPECT_FALSE(testsupport::Exists(paths::kJournal));
+}
+
+TEST_F(RecoverTest, AChangeOfControllersOnAnUnjoinedHostIsOver) {
+  SaveJournal({Journal::Operation::kPrefer, "", "", "", false});
+  RunRecover();
+  EXPECT_FALSE(testsupport::Exists(paths::kJournal));
+}
+
+TEST_F(RecoverTest, AJournalThatIsNotUnderstoodIsNone) {
+  testsupport::WriteFile(paths::kJournal, "{");
+  EXPECT_EQ(RunRecover(), "nothing was interrupted");
+}
+
+TEST_F(RecoverTest, TheJournalComesBackAsItWasSaved) {
+  SaveJournal({Journal::Operation::kLeave, "corp.example", "CORP", "SANDBOX", true});
+  const auto journal = LoadJournal();
+  ASSERT_TRUE(journal.has_value());
+  EXPECT_EQ(journal->operation, Journal::Operation::kLeave);
+  EXPECT_EQ(journal->dnsDomain, "corp.example");
+  EXPECT_EQ(journal->netbiosDomain, "CORP");
+  EXPECT_EQ(journal->computer, "SANDBOX");
+  EXPECT_TRUE(journal->accountIsNew);
+}
+
+}  // namespace
+}  // namespace sambaprovider
