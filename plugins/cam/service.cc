@@ -106,11 +106,7 @@ Service::Service(const std::string& server, bool verifyCertificate, const std::s
   if (inet_pton(AF_INET, server.c_str(), &address) != 1) {
     throw Failure(INVALID_PARAMETER, "not an IPv4 address");
   }
-  if (verifyCertificate) {
-    const auto pin = settings_.sha256OfServer.find(server);
-    check_.emplace(server, thumbprint,
-                   pin == settings_.sha256OfServer.end() ? std::nullopt : std::optional(pin->second));
-  }
+  if (verifyCertificate) check_.emplace(server, thumbprint, settings_.Sha256For(server));
 }
 
 Answer Service::Ask(const Request& request, unsigned int successStatus) {

@@ -68,6 +68,11 @@ class SettingsFile {
 
 }  // namespace
 
+std::optional<Sha256> Settings::Sha256For(const std::string& server) const {
+  const auto own = sha256OfServer.find(server);
+  return own != sha256OfServer.end() ? own->second : sha256;
+}
+
 Settings LoadSettings() {
   const SettingsFile file;
   if (!file.Exists()) return {};

@@ -5,6 +5,7 @@
 #include <chrono>
 #include <cstdint>
 #include <map>
+#include <optional>
 #include <string>
 
 #include "fingerprint.h"
@@ -22,8 +23,12 @@ struct Settings {
   std::chrono::seconds requestTimeout{60};
   /// What the service wants for one creation; empty for none.
   SecretString token;
-  /// Server address -> the SHA-256 of its certificate.
+  /// The SHA-256 of the certificate that was imported, and of those of single servers by their address.
+  std::optional<Sha256> sha256;
   std::map<std::string, Sha256> sha256OfServer;
+
+  /// The one that counts for the server at that address.
+  std::optional<Sha256> Sha256For(const std::string& server) const;
 };
 
 /// Reads the settings file; the defaults when there is none. Throws Failure for SETTINGS_FAULT when it cannot

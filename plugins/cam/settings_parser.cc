@@ -67,18 +67,21 @@ class Parser {
     } else if (key == "token") {
       if (!IsToken(value)) Refuse("needs a token of printable characters without blanks");
       settings_.token = value;
+    } else if (key == "sha256") {
+      settings_.sha256 = Digest(value);
     } else if (key.starts_with(SHA256_PREFIX)) {
-      SetSha256(key.substr(SHA256_PREFIX.size()), value);
+      const std::string server = key.substr(SHA256_PREFIX.size());
+      if (!IsAddress(server)) Refuse("needs an IPv4 address behind \"sha256-\"");
+      settings_.sha256OfServer[server] = Digest(value);
     } else {
       Refuse("has the unknown key '" + key + "'");
     }
   }
 
-  void SetSha256(const std::string& server, std::string_view value) {
+  Sha256 Digest(std::string_view value) const {
     const auto digest = ParseSha256(value);
-    if (!IsAddress(server)) Refuse("needs an IPv4 address behind \"sha256-\"");
     if (!digest) Refuse("needs a SHA-256 of 64 hexadecimal digits");
-    settings_.sha256OfServer[server] = *digest;
+    return *digest;
   }
 
   int Number(std::string_view value, int least, int most) const {

@@ -108,6 +108,20 @@ TEST(CamVerificationTest, MatchingSha256DoesNotReplaceTheThumbprint) {
   EXPECT_EQ(CreateAt(identity, Identity().Sha1(), Pin(identity.Sha256())), REFUSED_BEFORE_ANYTHING_WAS_SENT);
 }
 
+TEST(CamVerificationTest, Sha256WithoutAnAddressCountsForEveryServer) {
+  const Identity identity;
+  EXPECT_EQ(CreateAt(identity, identity.Sha1(), "sha256 = " + identity.Sha256() + "\n"), ACCEPTED);
+  EXPECT_EQ(CreateAt(identity, identity.Sha1(), "sha256 = " + Identity().Sha256() + "\n"),
+            REFUSED_BEFORE_ANYTHING_WAS_SENT);
+}
+
+TEST(CamVerificationTest, Sha256OfTheServerCountsInPlaceOfTheOneForAll) {
+  const Identity identity;
+  EXPECT_EQ(
+      CreateAt(identity, identity.Sha1(), Pin(identity.Sha256()) + "sha256 = " + Identity().Sha256() + "\n"),
+      ACCEPTED);
+}
+
 TEST(CamVerificationTest, Sha256OfAnotherServerDoesNotCount) {
   const Identity identity;
   EXPECT_EQ(CreateAt(identity, identity.Sha1(), Pin(Identity().Sha256(), "127.0.0.2")), ACCEPTED);

@@ -135,7 +135,7 @@ class ConflictTest(LabTest):
 
     def testTwoJoinsAtOnceGiveOneMember(self):
         both = "for _ in 1 2; do velmorctl join corp.example -U Administrator --password-file /run/home/p " \
-               "2>/dev/null & done; wait -n; echo $?; wait -n; echo $?"
+               ">/dev/null 2>&1 & done; wait -n; echo $?; wait -n; echo $?"
         self.host.must("sh", "-c", "umask 077; cat >/run/home/p", given=ADMINISTRATOR_PASSWORD)
         self.assertEqual(sorted(self.host.must("bash", "-c", both).split()), ["0", "10"])
 

@@ -1,8 +1,5 @@
 #!/bin/sh
 # sandbox_test.sh VELMOR-SANDBOX: what a program changes in the sandbox must not be seen on the machine.
-#
-# The programs in single quotes run inside and expand their variables there.
-# shellcheck disable=SC2016
 set -eu
 sandbox=$1
 
@@ -82,7 +79,7 @@ kill -KILL $launcher
 wait $launcher || true
 # The kernel kills the rest at once; the file's last user is gone when nobody holds it open any more.
 tries=0
-while [ -n "$(find /proc/[0-9]*/fd -lname "$marker" 2>/dev/null)" ]; do
+while ls -l /proc/[0-9]*/fd 2>/dev/null | grep -qF "$marker"; do
   tries=$((tries + 1))
   [ $tries -lt 200 ] || fail "a killed launcher left processes behind"
   sleep 0.05

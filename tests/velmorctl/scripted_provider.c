@@ -109,15 +109,17 @@ static void recordAttempt(const char* event, uint32_t status, const char* text) 
   mkdir(RECORD_FOLDER, 0755);
   FILE* file = fopen(RECORD_FOLDER "/attempts.log", "a");
   if (file != NULL) {
-    fprintf(file,
-            "{\"time\":\"2026-11-21T01:20:03.125Z\",\"process\":%d,\"operation\":\"join\",\"step\":\"password\","
-            "\"event\":\"%s\",\"status\":%" PRIu32 ",\"text\":\"%s\"}\n",
-            (int)getpid(), event, status, text);
+    fprintf(
+        file,
+        "{\"time\":\"2026-11-21T01:20:03.125Z\",\"process\":%d,\"operation\":\"join\",\"step\":\"password\","
+        "\"event\":\"%s\",\"status\":%" PRIu32 ",\"text\":\"%s\"}\n",
+        (int)getpid(), event, status, text);
     fclose(file);
   }
 }
 
-static uint32_t joinDomain(const char* domain, const char* organizationalUnit, const Credentials* credentials) {
+static uint32_t joinDomain(const char* domain, const char* organizationalUnit,
+                           const Credentials* credentials) {
   char call[512];
   snprintf(call, sizeof(call), "joinDomain %s %s %s (%zu characters)", domain,
            organizationalUnit == NULL ? "-" : organizationalUnit, credentials->username,
@@ -154,7 +156,8 @@ static uint32_t getActiveDomain(ActiveDirectoryDomainPair* domain, ActiveDirecto
   return status;
 }
 
-static uint32_t getLines(const char* operation, const char* name, char*** list, ActiveDirectoryFree* release) {
+static uint32_t getLines(const char* operation, const char* name, char*** list,
+                         ActiveDirectoryFree* release) {
   uint32_t status = play(operation, operation);
   if (status == 0) {
     *list = lines(name);

@@ -16,7 +16,8 @@ constexpr AddCommand commands[] = {AddStatusCommand,
                                    AddProviderCommand,
                                    AddDomainControllerCommand,
                                    AddSmartCardCommand,
-                                   AddOptionCommand};
+                                   AddOptionCommand,
+                                   AddCamCommand};
 
 }  // namespace
 

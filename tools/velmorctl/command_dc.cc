@@ -49,9 +49,8 @@ ExitCode Show(const Options& options, Situation& situation) {
 /// The library only logs that the provider cannot set them, so this looks first.
 void RequireSettable() {
   PluginDescription plugin = InspectProvider(InspectProviderFile().value);
-  bool lacking = std::any_of(plugin.operations.begin(), plugin.operations.end(), [](const auto& operation) {
-    return operation.first == "setPreferredDomainControllers" && !operation.second;
-  });
+  std::vector<std::string> missing = MissingOperations(plugin);
+  bool lacking = std::find(missing.begin(), missing.end(), "setPreferredDomainControllers") != missing.end();
   if (lacking) {
     throw Failure(ExitCode::ProviderUnusable,
                   "the provider '" + plugin.name + "' cannot set preferred domain controllers")

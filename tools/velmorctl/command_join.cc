@@ -1,4 +1,5 @@
 /// velmorctl join: makes the host a member of a domain.
+#include <functional>
 #include <iostream>
 
 #include "account.h"
@@ -31,9 +32,22 @@ struct Options {
   std::string userName = "Administrator";
   PasswordSource password;
   bool skipHostNameCheck = false;
+  std::string proxy;
+  std::string container;
 
+  bool ThroughProxy() const { return !proxy.empty(); }
   std::string Domain() const { return target.substr(0, target.find('/')); }
+
+  /// What is joined, and how, for people.
+  std::string Description() const {
+    return ThroughProxy() ? "the domain of the CAM service at " + proxy : Domain() + " as " + userName;
+  }
 };
+
+/// Which domain a join was to. Through the proxy, only the record of the join knows.
+std::string JoinedDomain(const Options& options) {
+  return options.ThroughProxy() ? ActiveDirectoryConfigStore().GetDomainName() : options.Domain();
+}
 
 void WatchHostFiles(Situation& situation) {
   for (const char* file : {authenticationFile, "/etc/hosts", "/etc/resolv.conf", "/etc/samba/smb.conf"}) {
@@ -63,11 +77,15 @@ std::shared_ptr<Account> ReadAccount(const Options& options) {
   return account;
 }
 
-/// Leaves the domain again and removes the record of the join.
+/// Leaves the domain again and removes the record of the join. A join through the proxy has no account.
 [[noreturn]] void Undo(Directory& directory, const std::shared_ptr<Account>& account, Progress& progress,
                        SignalPipe& signals, int signalNumber, Situation& situation) {
   progress.Step("undoing the join");
   auto undo = [store = directory.Store(), account] {
+    if (!account) {
+      store->PartDomain();
+      return;
+    }
     store->PartDomain(account->AsCredentials());
     ActiveDirectoryConfigStore().RemoveDomainInfo();
   };
@@ -80,15 +98,25 @@ std::shared_ptr<Account> ReadAccount(const Options& options) {
   throw Interrupted(signalNumber, "the host has left the domain again");
 }
 
+std::function<void()> JoinCall(const Options& options, Directory& directory,
+                               const std::shared_ptr<Account>& account) {
+  if (options.ThroughProxy()) {
+    return [store = directory.Store(), proxy = options.proxy, container = options.container,
+            skip = options.skipHostNameCheck] { store->JoinDomainWithCAM(proxy, container, skip); };
+  }
+  return [store = directory.Store(), account, target = options.target, skip = options.skipHostNameCheck] {
+    store->JoinDomain(target, account->AsCredentials(), skip);
+  };
+}
+
 void JoinInterruptibly(const Options& options, Directory& directory, const std::shared_ptr<Account>& account,
                        Progress& progress, Situation& situation) {
   SignalPipe signals{SIGINT, SIGTERM, SIGHUP};
-  progress.Step("joining " + options.target + " as " + options.userName +
-                (options.skipHostNameCheck ? "" : ", after a check of the host's name"));
-  auto join = [store = directory.Store(), account, target = options.target,
-               skip = options.skipHostNameCheck] {
-    store->JoinDomain(target, account->AsCredentials(), skip);
-  };
+  progress.Step(
+      "joining " +
+      (options.ThroughProxy() ? options.Description() : options.target + " as " + options.userName) +
+      (options.skipHostNameCheck ? "" : ", after a check of the host's name"));
+  std::function<void()> join = JoinCall(options, directory, account);
   CallOutcome outcome = RunWatched(join, progress, signals, waitForEnd);
   situation.providerReason = progress.ProviderReason();
   if (outcome.failure && outcome.signalNumber) {
@@ -97,8 +125,9 @@ void JoinInterruptibly(const Options& options, Directory& directory, const std::
   if (outcome.failure) {
     std::rethrow_exception(outcome.failure);
   }
-  situation.AddChange("the host has joined " + options.Domain());
-  progress.Step("joined " + options.Domain() + " and recorded it");
+  const std::string domain = JoinedDomain(options);
+  situation.AddChange("the host has joined " + domain);
+  progress.Step("joined " + domain + " and recorded it");
   if (outcome.signalNumber) {
     Undo(directory, account, progress, signals, *outcome.signalNumber, situation);
   }
@@ -120,27 +149,37 @@ ExitCode Verify(Directory& directory, Progress& progress, const std::string& req
   return code;
 }
 
-ExitCode Join(const Options& options, Situation& situation) {
-  RequireRoot("join a domain");
-  if (options.Domain().empty()) {
+void RequireTarget(const Options& options) {
+  if (options.ThroughProxy() != options.target.empty()) {
+    throw Failure(ExitCode::Usage, "give either a domain or a proxy, which knows the domain")
+        .Try("velmorctl join corp.example/Servers/Hosts, or velmorctl join --proxy ADDRESS");
+  }
+  if (!options.ThroughProxy() && options.Domain().empty()) {
     throw Failure(ExitCode::Usage, "the domain is missing").Try("velmorctl join corp.example/Servers/Hosts");
   }
-  situation.doing = "join " + options.Domain() + " as " + options.userName;
+}
+
+ExitCode Join(const Options& options, Situation& situation) {
+  RequireRoot("join a domain");
+  RequireTarget(options);
+  situation.doing = "join " + options.Description();
+  situation.throughProxy = options.ThroughProxy();
   WatchHostFiles(situation);
   OperationLock lock;
   Directory directory(answerTimeout);
   RequireActivation(directory);
-  std::shared_ptr<Account> account = ReadAccount(options);
+  std::shared_ptr<Account> account = options.ThroughProxy() ? nullptr : ReadAccount(options);
   std::string provider = InspectProviderFile().value;
   Progress progress(provider);
   progress.Step("provider: " + provider);
   JoinInterruptibly(options, directory, account, progress, situation);
   account.reset();
+  situation.throughProxy = false;
   situation.doing = "make the store \"Active Directory\" active";
   progress.Step("making the store \"Active Directory\" active");
   directory.Store()->MakeActive();
   situation.doing = "verify the join";
-  return Verify(directory, progress, options.Domain());
+  return Verify(directory, progress, JoinedDomain(options));
 }
 
 }  // namespace
@@ -149,8 +188,11 @@ void AddJoinCommand(CLI::App& root, Invocation& invocation) {
   auto options = std::make_shared<Options>();
   CLI::App* join = root.add_subcommand("join", "Join a domain");
   join->add_option("DOMAIN[/OU]", options->target,
-                   "The domain's DNS name, and the organizational unit for the computer account")
-      ->required();
+                   "The domain's DNS name, and the organizational unit for the computer account");
+  CLI::Option* proxy =
+      join->add_option("--proxy", options->proxy,
+                       "Let the CAM service at this IPv4 address create the computer account; needs no user");
+  join->add_option("--container", options->container, "Where that service creates the account")->needs(proxy);
   join->add_option("-U,--user", options->userName, "The account that may join hosts")->capture_default_str();
   join->add_flag("--skip-hostname-check", options->skipHostNameCheck,
                  "Take the host's name as it is, and leave the hosts file and the DNS search list alone");

@@ -59,12 +59,7 @@ ExitCode List(const Options& options, Situation&) {
 }
 
 std::string OperationsText(const PluginDescription& plugin) {
-  std::vector<std::string> missing;
-  for (const auto& [name, present] : plugin.operations) {
-    if (!present) {
-      missing.push_back(name);
-    }
-  }
+  std::vector<std::string> missing = MissingOperations(plugin);
   return missing.empty() ? "all" : "all but " + Join(missing, ", ");
 }
 

@@ -3,6 +3,7 @@
 
 #include "authentication/authentication_store_factory.h"
 #include "command.h"
+#include "directory.h"
 #include "failure.h"
 #include "output.h"
 #include "settings_file.h"
@@ -77,6 +78,9 @@ ExitCode Use(const Options& options, Situation& situation) {
   RequireRoot("change the active store");
   situation.doing = "make the store \"" + options.name + "\" active";
   situation.Watch(authenticationFile);
+  if (options.name == "Active Directory") {
+    RequireUsableProvider();
+  }
   std::unique_ptr<AuthenticationStore> store = Factory().CreateInstance(options.name);
   if (!store) {
     throw Failure(ExitCode::Usage, "there is no store \"" + options.name + "\"")

@@ -3,6 +3,8 @@
 #include "authentication/active_directory_config_store.h"
 #include "failure.h"
 #include "orvconfigstore/config_store.h"
+#include "plugin_file.h"
+#include "settings_file.h"
 
 namespace velmorctl {
 
@@ -17,6 +19,18 @@ void AddTimeoutOption(CLI::App& command, int& timeoutSeconds) {
       ->capture_default_str();
 }
 
+void RequireUsableProvider() {
+  SettingsInspection settings = InspectProviderFile();
+  if (settings.problem) {
+    return;
+  }
+  PluginDescription plugin = InspectProvider(settings.value);
+  if (plugin.problem) {
+    throw AsFailure(*plugin.problem, ExitCode::ProviderUnusable,
+                    "the provider '" + plugin.name + "' cannot be used");
+  }
+}
+
 std::optional<JoinRecord> ReadJoinRecord() {
   auto store = OrvConfigStore::ConfigStore::GetStore(OrvConfigStore::sGlobalNamespace);
   auto object = store->GetObject(ActiveDirectoryConfigStore::AD_CSO_ID);
@@ -29,8 +43,10 @@ std::optional<JoinRecord> ReadJoinRecord() {
   return record;
 }
 
-Directory::Directory(std::chrono::seconds timeout)
-    : watch_(timeout), store_(std::make_shared<ActiveDirectoryStore>(static_cast<int>(timeout.count()))) {}
+Directory::Directory(std::chrono::seconds timeout) : watch_(timeout) {
+  RequireUsableProvider();
+  store_ = std::make_shared<ActiveDirectoryStore>(static_cast<int>(timeout.count()));
+}
 
 Answer<ActiveDirectoryStoreConfiguration> Directory::Configuration() {
   return watch_.Ask([this] {

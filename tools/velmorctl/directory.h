@@ -22,6 +22,10 @@ void AddTimeoutOption(CLI::App& command, int& timeoutSeconds);
 /// How long the commands that only read wait for an answer unless they are told otherwise.
 inline constexpr int defaultTimeoutSeconds = 30;
 
+/// Looks at the configured provider's plug-in in a child process, before the library loads it into this one.
+/// Throws Failure when it cannot be used; leaves a fault of provider.conf to the library.
+void RequireUsableProvider();
+
 /// The record of the join in the host's configuration store.
 struct JoinRecord {
   std::string domainName;
@@ -35,7 +39,8 @@ std::optional<JoinRecord> ReadJoinRecord();
 /// at a time; for one thread.
 class Directory {
  public:
-  /// Loads the provider; throws what the store's constructor throws.
+  /// Loads the provider; throws Failure when its plug-in cannot be used, and what the store's constructor
+  /// throws.
   explicit Directory(std::chrono::seconds timeout);
 
   Answer<quenix::authentication::ActiveDirectoryStoreConfiguration> Configuration();

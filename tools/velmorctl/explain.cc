@@ -1,8 +1,5 @@
 #include "explain.h"
 
-#include <unistd.h>
-
-#include <cerrno>
 #include <optional>
 #include <system_error>
 
@@ -11,6 +8,7 @@
 #include "hostmgmt/host_management_exception.h"
 #include "meanings.h"
 #include "plugin_file.h"
+#include "proxy_meanings.h"
 #include "settings_file.h"
 #include "text.h"
 
@@ -26,30 +24,15 @@ std::optional<FileProblem> ProviderProblem() {
   if (settings.problem) {
     return settings.problem;
   }
-  std::optional<FileProblem> problem = InspectProvider(settings.value).problem;
-  if (problem && access(problem->file.c_str(), R_OK) != 0 && errno == EACCES && geteuid() != 0) {
-    problem->needsRoot = true;
-    problem->remedy = "run the command as root";
-  }
-  return problem;
-}
-
-/// The operations that the configured provider does not have.
-std::string MissingOperations(const PluginDescription& plugin) {
-  std::vector<std::string> missing;
-  for (const auto& [name, present] : plugin.operations) {
-    if (!present) {
-      missing.push_back(name);
-    }
-  }
-  return missing.empty() ? "none" : Join(missing, ", ");
+  return InspectProvider(settings.value).problem;
 }
 
 Failure WithoutOperation(Failure failure) {
   PluginDescription plugin = InspectProvider(InspectProviderFile().value);
   return failure.Detail("provider", plugin.name)
       .Detail("file", plugin.file)
-      .Detail("reason", "the plug-in does not have this operation; it lacks: " + MissingOperations(plugin));
+      .Detail("reason",
+              "the plug-in does not have this operation; it lacks: " + Join(MissingOperations(plugin), ", "));
 }
 
 /// Looks at the files that the failure may come from.
@@ -68,7 +51,8 @@ std::optional<FileProblem> ProblemBehind(const Meaning& meaning) {
 
 Failure ExplainException(const Exception& exception, const Situation& situation,
                          const std::string& happened) {
-  const Meaning& meaning = MeaningOf(exception);
+  const bool byProxy = situation.throughProxy && situation.providerReason.empty();
+  const Meaning& meaning = byProxy ? ProxyMeaningOf(exception) : MeaningOf(exception);
   if (meaning.missingOperation) {
     return WithoutOperation(Failure(meaning.code, happened).Try(meaning.advice));
   }

@@ -214,6 +214,10 @@ PluginDescription InspectFile(const std::string& name, const std::string& file) 
   } else {
     description.problem = Unusable(file, elfProblem);
   }
+  if (description.problem && geteuid() != 0 && access(file.c_str(), R_OK) != 0 && errno == EACCES) {
+    description.problem->needsRoot = true;
+    description.problem->remedy = "run the command as root";
+  }
   return description;
 }
 
@@ -229,6 +233,16 @@ std::string ProviderNameOf(const std::string& fileName) {
 }
 
 }  // namespace
+
+std::vector<std::string> MissingOperations(const PluginDescription& plugin) {
+  std::vector<std::string> missing;
+  for (const auto& [name, present] : plugin.operations) {
+    if (!present) {
+      missing.push_back(name);
+    }
+  }
+  return missing;
+}
 
 bool IsProviderName(const std::string& name) {
   return !name.empty() && std::all_of(name.begin(), name.end(), [](unsigned char character) {

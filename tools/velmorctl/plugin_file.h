@@ -31,6 +31,9 @@ struct PluginDescription {
   std::optional<FileProblem> problem;                    /// why the library cannot use it
 };
 
+/// The names of the operations that a usable plug-in does not have.
+std::vector<std::string> MissingOperations(const PluginDescription& plugin);
+
 /// Whether the text can name a provider: it becomes a part of a file name.
 bool IsProviderName(const std::string& name);
 

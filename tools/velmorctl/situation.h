@@ -22,6 +22,9 @@ class Situation {
   /// Why the provider failed, in its own words; empty when it did not say.
   std::string providerReason;
 
+  /// Whether the CAM service is asked: then its statuses count, unless the provider gave a reason of its own.
+  bool throughProxy = false;
+
   /// Remembers the file's content, so that Changes() can tell whether the command changed it. Files of more
   /// than a mebibyte are not looked at.
   void Watch(const std::string& file);

@@ -118,8 +118,9 @@ class Child {
   Child(SpawnPlan& plan, const std::vector<std::string>& command, ChildGroup group,
         ChildEnvironment environment)
       : process_(plan.Start(command, environment)), group_(group), handle_(pidfd_open(process_, 0)) {
-    if (handle_.IsOpen()) return;
+    // In a host that ignores its children's ends, this one may be gone without a trace already.
     const int error = errno;
+    if (handle_.IsOpen() || error == ESRCH) return;
     Kill();
     throw Failure(kInternalError, "cannot watch " + command[0] + ": " + ErrorText(error));
   }
@@ -131,7 +132,7 @@ class Child {
 
   // Waits for the end; the exit status, or -1 when it was killed by a signal, now or before.
   int Collect(Clock::time_point deadline) {
-    if (!WaitFor(handle_.Get(), POLLIN, deadline)) return Kill();
+    if (handle_.IsOpen() && !WaitFor(handle_.Get(), POLLIN, deadline)) return Kill();
     // A leader that has ended may have left others of its session behind.
     return group_ == ChildGroup::kOwn ? Kill() : Reap();
   }

@@ -90,10 +90,6 @@ std::optional<std::string> ReadFile(const std::string& path) {
 void ReplaceFile(const std::string& path, std::string_view content, mode_t mode) {
   TemporaryFile temporary(path);
   WriteAll(temporary.Descriptor(), content, path);
-  struct stat old = {};
-  if (stat(path.c_str(), &old) == 0 && fchown(temporary.Descriptor(), old.st_uid, old.st_gid) != 0) {
-    Fail("keep the owner of", path, errno);
-  }
   if (fchmod(temporary.Descriptor(), mode) != 0) Fail("set the mode of", path, errno);
   if (fsync(temporary.Descriptor()) != 0) Fail("flush", path, errno);
   temporary.RenameTo(path);

@@ -18,8 +18,7 @@ std::string ErrorText(int error);
 // The content of a file; nothing when it does not exist.
 std::optional<std::string> ReadFile(const std::string& path);
 
-// Replaces a file through a temporary one beside it and a rename; data and folder are flushed to disk. An
-// existing file's owner is kept.
+// Replaces a file through a temporary one beside it and a rename; data and folder are flushed to disk.
 void ReplaceFile(const std::string& path, std::string_view content, mode_t mode);
 
 // Removes a file and flushes its folder; one that does not exist is no failure.

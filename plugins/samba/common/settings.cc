@@ -49,7 +49,7 @@ class Parser {
     } else if (key == "winbind-request-timeout") {
       settings_.winbindRequestTimeout = Seconds(value, 2, 600);
     } else if (key == "operation-timeout") {
-      settings_.operationTimeout = Seconds(value, 10, 3600);
+      settings_.operationTimeout = Seconds(value, 1, 3600);
     } else {
       Refuse("has the unknown key '" + key + "'");
     }

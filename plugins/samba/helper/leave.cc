@@ -12,8 +12,9 @@
 namespace sambaprovider {
 namespace {
 
-// A wrong password is found out here, with its reason and with one attempt.
-void CheckCredentials(const Call& call, const State& state, const std::string& user) {
+// A wrong password is found out here, with its reason and with one attempt. Returns whether the directory
+// still has the computer account.
+bool CheckCredentials(const Call& call, const State& state, const std::string& user) {
   if (SplitAccountName(user).user.empty()) throw Failure(kInvalidAccountName, "the user name is empty");
   std::vector<std::string> controllers = state.preferredDomainControllers;
   call.log.Run("locate", "asking DNS for the controllers of " + state.dnsDomain, [&] {
@@ -21,7 +22,33 @@ void CheckCredentials(const Call& call, const State& state, const std::string& u
     controllers.insert(controllers.end(), found.begin(), found.end());
     return std::to_string(found.size()) + " known";
   });
-  Inspect(call.log, {state.dnsDomain, controllers, user, call.request.secret, state.hostName}, "");
+  return !Inspect(call.log, {state.dnsDomain, controllers, user, call.request.secret, state.hostName}, "")
+              .accountDn.empty();
+}
+
+void UnjoinWithAccount(const Call& call, const std::string& user) {
+  try {
+    call.log.Run("unjoin", "disabling the computer account", [&] {
+      netapi::Unjoin(user, call.request.secret);
+      return "the account is disabled, the machine's secrets are removed";
+    });
+  } catch (const Failure&) {
+    // It reports an error only while the secrets are still there.
+    RemoveJournal();
+    throw;
+  }
+}
+
+void UnjoinWithoutAccount(const Call& call) {
+  try {
+    call.log.Run("unjoin", "removing the machine's secrets", [] {
+      netapi::UnjoinLocally();
+      return "removed; an account in the directory stays";
+    });
+  } catch (const Failure&) {
+    // There is nothing that a host without secrets could not leave.
+    call.log.Note("unjoin", "this host has no machine secrets");
+  }
 }
 
 }  // namespace
@@ -35,26 +62,13 @@ std::string Leave(const Call& call) {
     RequireSmbConfIsReplaceable();
     return "the host is a member of " + state.dnsDomain;
   });
-  if (withAccount) CheckCredentials(call, state, user);
+  const bool disableAccount = withAccount && CheckCredentials(call, state, user);
 
   SaveJournal({Journal::Operation::kLeave, state.dnsDomain, state.netbiosDomain, state.hostName, false});
-  try {
-    call.log.Run("unjoin", withAccount ? "disabling the computer account" : "removing the machine's secrets",
-                 [&] {
-                   if (withAccount) {
-                     netapi::Unjoin(user, call.request.secret);
-                     return "the account is disabled, the machine's secrets are removed";
-                   }
-                   netapi::UnjoinLocally();
-                   return "removed; the account in the directory stays";
-                 });
-  } catch (const Failure&) {
-    // It reports an error only while the secrets are still there.
-    if (withAccount) {
-      RemoveJournal();
-      throw;
-    }
-    call.log.Note("unjoin", "this host has no machine secrets");
+  if (disableAccount) {
+    UnjoinWithAccount(call, user);
+  } else {
+    UnjoinWithoutAccount(call);
   }
   FinishLeave(call.log);
   return "the host has left " + state.dnsDomain;

@@ -99,8 +99,8 @@ void Unjoin(const std::string& user, const Secret& password) {
 
 void UnjoinLocally() {
   Context();
-  // Without a server's name it looks for a domain controller, although it does not need one; a name that stands
-  // for this host spares that. It also insists on an account that it does not use.
+  // Without a server's name it looks for a domain controller, although it does not need one; a name that
+  // stands for this host spares that. It also insists on an account that it does not use.
   Check(NetUnjoinDomain("127.0.0.1", "none", "none", NETSETUP_JOIN_DOMAIN), "removing the machine's secrets");
 }
 

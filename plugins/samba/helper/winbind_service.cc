@@ -43,8 +43,8 @@ void SystemCtl(const std::vector<std::string>& verb, std::chrono::milliseconds l
   command.insert(command.end() - 1, verb.begin(), verb.end());
   const ProgramResult result = RunProgram(command, ProgramOutput::kWanted, limit);
   if (result.exitStatus == 0) return;
-  throw Failure(kServiceNotActive,
-                std::string("systemctl ") + verb.front() + " " + kUnit + " failed: " + LastLine(result.output));
+  throw Failure(kServiceNotActive, std::string("systemctl ") + verb.front() + " " + kUnit +
+                                       " failed: " + LastLine(result.output));
 }
 
 struct Process {

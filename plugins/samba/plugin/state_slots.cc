@@ -27,13 +27,16 @@ void Return(const std::vector<std::string>& values, char*** names, ActiveDirecto
   *names = CopyForCaller(values);
 }
 
-// After a join without network the account's name has to be asked for.
+// After a join without network the account's name has to be asked for. While nobody answers it is not known,
+// which must not keep the caller from the rest of the store's configuration; the record has the reason.
 std::string MachineAccountDn() {
   const State state = LoadState();
   if (!state.joined || !state.machineAccountDn.empty()) return state.machineAccountDn;
-  Request request;
-  request.fields = {{"operation", "refresh"}};
-  RunHelper(std::move(request));
+  Guarded([] {
+    Request request;
+    request.fields = {{"operation", "refresh"}};
+    RunHelper(std::move(request));
+  });
   return LoadState().machineAccountDn;
 }
 

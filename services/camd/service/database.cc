@@ -1,28 +1,14 @@
 #include "service/database.h"
 
-#include <fcntl.h>
-
-#include <cerrno>
-
-#include "common/status.h"
-#include "common/unique_fd.h"
-
 namespace camd {
 namespace {
 
 constexpr int kBusyMilliseconds = 10000;
 
-// SQLite itself would make the file readable by all whom the process's mask lets.
-void MakeFile(const std::string& path) {
-  const UniqueFd file(open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0600));
-  if (!file.IsOpen()) throw DatabaseError("cannot open " + path + ": " + ErrorText(errno));
-}
-
 }  // namespace
 
 Database::Database(const std::string& path) : path_(path) {
-  MakeFile(path);
-  constexpr int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX;
+  constexpr int flags = SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_NOMUTEX;
   if (sqlite3_open_v2(path.c_str(), &handle_, flags, nullptr) != SQLITE_OK) {
     const std::string reason = handle_ == nullptr ? "not enough memory" : sqlite3_errmsg(handle_);
     sqlite3_close(handle_);

@@ -17,9 +17,10 @@ class DatabaseError : public std::runtime_error {
   using std::runtime_error::runtime_error;
 };
 
-// A connection to a database file, which is made when it is absent, with mode 0600. Every committed change is
-// on the disk. Waits up to ten seconds for another process. All operations throw DatabaseError. For one
-// thread at a time.
+// A connection to a database file, which is made when it is absent. Nothing else of the process may open and
+// close the file, since that would take the locks of this connection away. Every committed change is on the
+// disk. Waits up to ten seconds for another process. All operations throw DatabaseError. For one thread at a
+// time.
 class Database {
  public:
   explicit Database(const std::string& path);

@@ -1,5 +1,6 @@
 // velmor-camd: makes computer accounts for hosts that ask for one.
 #include <malloc.h>
+#include <sys/stat.h>
 #include <syslog.h>
 
 #include <CLI/CLI.hpp>
@@ -61,6 +62,8 @@ int main(int count, char** arguments) {
   // The libraries for HTTP and TLS keep copies of what they send; this way they are overwritten when they are
   // freed.
   mallopt(M_PERTURB, kErased);
+  // The ledger and the audit log are nobody else's business.
+  umask(S_IRWXG | S_IRWXO);
   openlog("velmor-camd", LOG_PID, LOG_DAEMON);
   CLI::App app("Makes computer accounts for hosts that ask for one");
   CommandLine line;

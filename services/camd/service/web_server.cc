@@ -3,6 +3,7 @@
 #include <arpa/inet.h>
 #include <microhttpd.h>
 #include <netinet/in.h>
+#include <sys/socket.h>
 #include <syslog.h>
 #include <unistd.h>
 
@@ -199,6 +200,8 @@ WebServer::~WebServer() {
 void WebServer::Stop() {
   if (daemon_ == nullptr) return;
   const int listener = MHD_quiesce_daemon(daemon_);
+  // It may be closed only when the server has ended, but who connects meanwhile must not wait for that.
+  if (listener >= 0) shutdown(listener, SHUT_RDWR);
   {
     std::unique_lock lock(mutex_);
     changed_.wait(lock, [this] { return underWay_ == 0; });

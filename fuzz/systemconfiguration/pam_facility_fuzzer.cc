@@ -1,0 +1,12 @@
+// The library and the plain reference must read the same facilities.
+#include <cstddef>
+#include <cstdint>
+
+#include "differential/pam_comparison.h"
+#include "require_no_difference.h"
+
+extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
+  const differential::InputCase input = differential::FromBytes(data, size);
+  RequireNoDifference(differential::CompareFacility(input), input);
+  return 0;
+}

@@ -1,0 +1,254 @@
+"""Starting, reloading and stopping the service, and what it remembers."""
+import signal
+import unittest
+
+from camd import PORT, Service, ServiceTest, connect, status_of_next, wait_until
+
+
+class StopTest(ServiceTest):
+
+    def testRequestUnderWayIsFinished(self):
+        self.service.behave(**{"wait-for": "go"})
+        creation = self.service.later(self.service.create)
+        wait_until(self.service.helper_requests)
+        self.service.process.send_signal(signal.SIGTERM)
+        wait_until(lambda: not self.accepts())
+        self.service.write("go", "")
+        self.assertEqual(creation.result().code, 201)
+        self.assertEqual(self.service.wait(), 0)
+
+    def testNewRequestOnAnOpenConnectionIsRefusedMeanwhile(self):
+        self.service.behave(**{"wait-for": "go"})
+        with connect() as connection:
+            creation = self.service.later(self.service.create)
+            wait_until(self.service.helper_requests)
+            self.service.process.send_signal(signal.SIGTERM)
+            wait_until(lambda: not self.accepts())
+            connection.sendall(b"GET /v1/domain HTTP/1.1\r\nHost: a\r\n\r\n")
+            self.assertEqual(status_of_next(connection), 503)
+        self.service.write("go", "")
+        self.assertEqual(creation.result().code, 201)
+
+    def testIdleConnectionDoesNotHoldItUp(self):
+        with connect():
+            self.assertEqual(self.service.stop(), 0)
+
+    def accepts(self):
+        try:
+            connect().close()
+            return True
+        except OSError:
+            return False
+
+
+class LedgerTest(ServiceTest):
+
+    def testAccountThatWasGivenOutIsRememberedAfterAKill(self):
+        self.service.create()
+        self.service.kill()
+        self.assertEqual(self.service.ledger(), [("HOST2", "given")])
+        self.service.start()
+        self.assertEqual(self.service.create("host3.corp.example").code, 201)
+
+    def testRequestCutShortByAKillIsMarkedAtTheNextStart(self):
+        self.service.behave(silent=True)
+        creation = self.service.later(self.service.create)
+        wait_until(self.service.helper_requests)
+        self.service.kill()
+        self.assertIsInstance(creation.exception(), OSError)
+        self.assertEqual(self.service.ledger(), [("HOST2", "requested")])
+        self.service.start()
+        self.assertEqual(self.service.ledger(), [("HOST2", "interrupted")])
+
+    def testLedgerBelongsToItsOwnerOnly(self):
+        self.assertEqual((self.service.folder / "ledger.db").stat().st_mode & 0o777, 0o600)
+
+
+class UnusedAccountTest(ServiceTest):
+
+    CHANGES = {"directory": {"remove-unused-after-hours": 2}}
+
+    def restart_later(self, hours):
+        """Makes all accounts older, and starts the service anew, which then looks for unused ones."""
+        self.service.stop()
+        self.service.change_ledger(f"UPDATE accounts SET requested = requested - {hours * 3600}")
+        self.service.start()
+
+    def testUnusedAccountIsRemovedAfterItsTime(self):
+        self.service.create()
+        self.restart_later(3)
+        wait_until(lambda: self.service.ledger() == [("HOST2", "removed")])
+        self.assertFalse((self.service.folder / "accounts/HOST2").exists())
+
+    def testRecordGoesToTheDirectoryWithTheRequest(self):
+        self.service.create()
+        self.restart_later(3)
+        wait_until(lambda: self.service.helper_requests("remove-unused"))
+        request = self.service.helper_requests("remove-unused")[0]
+        self.assertEqual((request["computer"], request["sid"], request["lastLogon"], request["logonCount"]),
+                         ("HOST2", f"S-1-5-21-1-2-3-{sum(b'HOST2')}", 22, 3))
+
+    def testAccountIsNotLookedAtBeforeItsTime(self):
+        self.service.create("host1.corp.example")
+        self.restart_later(3)
+        self.service.create("host2.corp.example")
+        self.restart_later(1)
+        wait_until(lambda: ("HOST1", "removed") in self.service.ledger())
+        self.assertEqual([request["computer"] for request in self.service.helper_requests("remove-unused")], ["HOST1"])
+
+    def testAccountInUseIsKeptForGood(self):
+        self.service.create()
+        self.service.write("accounts/HOST2", "used")
+        self.restart_later(3)
+        wait_until(lambda: self.service.ledger() == [("HOST2", "kept")])
+        self.restart_later(3)
+        self.service.domain()
+        self.assertEqual(len(self.service.helper_requests("remove-unused")), 1)
+
+    def testAccountStaysWhenTheDirectoryDoesNotAnswer(self):
+        self.service.create()
+        self.service.behave(status=1311)
+        self.restart_later(3)
+        wait_until(lambda: self.service.helper_requests("remove-unused"))
+        wait_until(lambda: any(event.get("outcome") == "not looked at" for event in self.service.audit()))
+        self.assertEqual(self.service.ledger(), [("HOST2", "given")])
+
+    def testRemovalIsInTheAuditLog(self):
+        self.service.create()
+        self.restart_later(3)
+        wait_until(lambda: any(event.get("outcome") == "removed" for event in self.service.audit()))
+
+
+class ReloadTest(ServiceTest):
+
+    def reload(self):
+        self.service.process.send_signal(signal.SIGHUP)
+
+    def testNewSettingsAreInForce(self):
+        self.assertEqual(self.service.domain().code, 200)
+        self.service.configure(access={"client-addresses": ["127.0.0.9"]})
+        self.reload()
+        wait_until(lambda: self.service.domain().code == 403)
+        self.assertEqual(self.service.domain(source="127.0.0.9").code, 200)
+
+    def testOldSettingsStayWhenTheNewOnesAreWrong(self):
+        self.service.configure(access={"client-addresses": ["127.0.0.9"], "colour": "blue"})
+        self.reload()
+        wait_until(lambda: any(event.get("event") == "reload" for event in self.service.audit()))
+        self.assertEqual(self.service.domain().code, 200)
+        self.assertEqual(self.service.domain(source="127.0.0.9").code, 200)
+
+    def testFaultIsReportedWithItsPlace(self):
+        self.service.configure(access={"colour": "blue"})
+        self.reload()
+        wait_until(lambda: any(event.get("event") == "reload" for event in self.service.audit()))
+        text = next(event["text"] for event in self.service.audit() if event.get("event") == "reload")
+        self.assertRegex(text, r"camd\.conf:\d+: .*colour")
+
+    def testRequestUnderWayIsNotDisturbed(self):
+        self.service.behave(**{"wait-for": "go"})
+        creation = self.service.later(self.service.create)
+        wait_until(self.service.helper_requests)
+        self.service.configure(access={"client-addresses": []})
+        self.reload()
+        wait_until(lambda: self.service.domain().code == 403)
+        self.service.write("go", "")
+        self.assertEqual(creation.result().code, 201)
+
+    def testAuditFileThatWasMovedAwayGetsASuccessor(self):
+        self.service.domain()
+        (self.service.folder / "audit.log").rename(self.service.folder / "audit.log.1")
+        self.reload()
+        wait_until(lambda: (self.service.folder / "audit.log").exists())
+        self.service.domain()
+        self.assertEqual(len(self.service.audit()), 1)
+
+    def testRefusedPasswordIsTriedAgain(self):
+        self.service.behave(status=1069)
+        self.service.create()
+        self.service.behave()
+        self.assertEqual(self.service.create().outcome, (500, 1069))
+        self.reload()
+        wait_until(lambda: self.service.create().code == 201)
+
+
+class ConfigurationTest(unittest.TestCase):
+
+    def setUp(self):
+        self.service = Service()
+        self.addCleanup(self.service.close)
+
+    def assert_refused(self, pattern):
+        checked = self.service.command("--check")
+        self.assertEqual(checked.returncode, 1)
+        self.assertRegex(checked.stderr, pattern)
+        self.assertEqual(self.service.command().returncode, 1)
+
+    def testGoodConfigurationPassesTheCheck(self):
+        checked = self.service.command("--check")
+        self.assertEqual((checked.returncode, checked.stderr), (0, ""))
+
+    def testUnknownKeyIsNamedWithItsLine(self):
+        self.service.configure(server={"colour": "blue"})
+        self.assert_refused(r"camd\.conf:\d+: unknown key \"colour\" in section \[server\]")
+
+    def testUnknownSectionIsNamedWithItsLine(self):
+        self.service.write("camd.conf", self.service.read("camd.conf") + "[kitchen]\n")
+        self.assert_refused(r"camd\.conf:\d+: unknown section \[kitchen\]")
+
+    def testTextThatIsNoSettingIsNamedWithItsLine(self):
+        self.service.write("camd.conf", "[server]\nport 8443\n")
+        self.assert_refused(r"camd\.conf:2: ")
+
+    def testMissingFileIsNamed(self):
+        self.service.configuration.unlink()
+        self.assert_refused(r"camd\.conf: ")
+
+    def testValueOfAnotherTypeIsRefused(self):
+        for section, key, value in (("server", "port", "8443"), ("server", "port", 0), ("server", "port", 65536),
+                                    ("server", "helpers", 1.5), ("directory", "domain", 7),
+                                    ("access", "host-names", "all"), ("access", "host-names", [7]),
+                                    ("access", "client-addresses", ["10.0.0.0/33"]),
+                                    ("access", "client-addresses", ["10.0.0.1/24"]),
+                                    ("access", "client-addresses", ["everywhere"]),
+                                    ("access", "token-required", "yes"),
+                                    ("directory", "existing-accounts", "keep")):
+            with self.subTest(key=key, value=value):
+                self.service.configure(**{section: {key: value}})
+                self.assert_refused(rf"camd\.conf:\d+: ")
+
+    def testMissingKeyIsNamed(self):
+        text = self.service.read("camd.conf").replace('user = "camsvc"\n', "")
+        self.service.write("camd.conf", text)
+        self.assert_refused(r"key \"user\" of section \[directory\] is missing")
+
+    def testPasswordThatOthersCanReadIsRefused(self):
+        (self.service.folder / "password").chmod(0o640)
+        self.assert_refused("password is open to others than its owner")
+
+    def testKeyThatOthersCanReadIsRefused(self):
+        (self.service.folder / "camd.key").chmod(0o644)
+        self.assert_refused("camd.key is open to others than its owner")
+
+    def testMissingPasswordIsRefused(self):
+        (self.service.folder / "password").unlink()
+        self.assert_refused("cannot open .*password")
+
+    def testCredentialOfTheSystemManagerIsWanted(self):
+        self.service.configure(directory={"password-file": "camd-password"})
+        self.assert_refused("handed over no credential 'camd-password'")
+
+    def testCertificateThatIsNoneIsRefusedAtTheStart(self):
+        self.service.write("camd.pem", "no certificate\n")
+        done = self.service.command()
+        self.assertEqual(done.returncode, 1)
+        self.assertIn(f"port {PORT}", done.stderr)
+
+    def testPortThatIsTakenIsReported(self):
+        self.service.start()
+        done = self.service.command()
+        self.assertEqual(done.returncode, 1)
+        self.assertIn("Address already in use", done.stderr)
+
+    def testUnknownOptionIsAUsageError(self):
+        self.assertEqual(self.service.command("--colour").returncode, 2)

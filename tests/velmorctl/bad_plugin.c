@@ -1,0 +1,23 @@
+/* A plug-in that does harm while it is loaded, or names no modules; which one is a matter of the build. */
+#include <signal.h>
+#include <stdlib.h>
+#include <unistd.h>
+
+#include "authentication/plugin/active_directory_client.h"
+
+#if defined(BAD_CRASH) || defined(BAD_EXIT) || defined(BAD_HANG)
+__attribute__((constructor)) static void doHarm(void) {
+#if defined(BAD_CRASH)
+  raise(SIGSEGV);
+#elif defined(BAD_EXIT)
+  _exit(0);
+#else
+  for (;;) {
+    pause();
+  }
+#endif
+}
+#endif
+
+const struct ActiveDirectoryClientMetadata ActiveDirectoryClientMetadata = {3, NULL, NULL, NULL, NULL};
+const struct ActiveDirectoryClientOperations ActiveDirectoryClientOperations = {.apiVersion = 3};

@@ -1,0 +1,231 @@
+#include <gtest/gtest.h>
+
+#include <csignal>
+#include <fstream>
+#include <iterator>
+#include <sstream>
+
+#include "prepared_host.h"
+#include "terminal_session.h"
+
+namespace velmorctltest {
+
+namespace {
+
+const std::vector<std::string> JOIN_AT_TERMINAL = {"join", "corp.example", "-U", "alice",
+                                                   "--skip-hostname-check"};
+
+std::vector<std::string> JoinWith(std::vector<std::string> source) {
+  std::vector<std::string> arguments = JOIN_AT_TERMINAL;
+  arguments.insert(arguments.end(), source.begin(), source.end());
+  return arguments;
+}
+
+std::string Raw(const std::string& path) {
+  std::ifstream stream(path, std::ios::binary);
+  return std::string(std::istreambuf_iterator<char>(stream), {});
+}
+
+/// Whether the text stands anywhere in the writable memory of the process.
+bool MemoryHolds(pid_t process, const std::string& text) {
+  constexpr std::uint64_t greatestRegion = 64U << 20;  // A sanitizer's shadow is greater, and has no text.
+  std::istringstream maps(Raw("/proc/" + std::to_string(process) + "/maps"));
+  std::ifstream memory("/proc/" + std::to_string(process) + "/mem", std::ios::binary);
+  for (std::string line; std::getline(maps, line);) {
+    std::uint64_t begin = 0;
+    std::uint64_t end = 0;
+    char dash = 0;
+    std::string permissions;
+    std::istringstream(line) >> std::hex >> begin >> dash >> end >> permissions;
+    if (permissions.compare(0, 2, "rw") != 0 || end - begin > greatestRegion) {
+      continue;
+    }
+    std::string content(end - begin, '\0');
+    memory.clear();
+    memory.seekg(static_cast<std::streamoff>(begin));
+    memory.read(content.data(), static_cast<std::streamsize>(content.size()));
+    if (content.find(text) != std::string::npos) {
+      return true;
+    }
+  }
+  return false;
+}
+
+class PasswordTest : public PreparedHost {
+ protected:
+  static const inline std::string JOIN_CALL = "joinDomain corp.example - alice (15 characters)";
+};
+
+TEST_F(PasswordTest, IsTheFirstLineOfAFile) {
+  testsupport::WriteFile(PASSWORD_FILE, PASSWORD + "\nanother line\n");
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-file", PASSWORD_FILE})).exitCode, 0);
+  EXPECT_TRUE(Called(JOIN_CALL));
+}
+
+TEST_F(PasswordTest, NeedsNoNewlineAtTheEndOfTheFile) {
+  testsupport::WriteFile(PASSWORD_FILE, PASSWORD);
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-file", PASSWORD_FILE})).exitCode, 0);
+  EXPECT_TRUE(Called(JOIN_CALL));
+}
+
+TEST_F(PasswordTest, LosesACarriageReturn) {
+  testsupport::WriteFile(PASSWORD_FILE, PASSWORD + "\r\n");
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-file", PASSWORD_FILE})).exitCode, 0);
+  EXPECT_TRUE(Called(JOIN_CALL));
+}
+
+TEST_F(PasswordTest, IsReadFromStandardInputForADash) {
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-file", "-"}), WithInput(PASSWORD + "\n")).exitCode, 0);
+  EXPECT_TRUE(Called(JOIN_CALL));
+}
+
+TEST_F(PasswordTest, IsReadFromADescriptor) {
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-fd", "10"}), WithDescriptor(PASSWORD + "\n")).exitCode, 0);
+  EXPECT_TRUE(Called(JOIN_CALL));
+}
+
+TEST_F(PasswordTest, CannotComeFromTwoPlaces) {
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-fd", "0", "--password-file", PASSWORD_FILE})).exitCode, 2);
+}
+
+TEST_F(PasswordTest, CannotBeGivenAsAnOption) {
+  EXPECT_EQ(Velmorctl(JoinWith({"--password", PASSWORD})).exitCode, 2);
+  EXPECT_EQ(Velmorctl(JoinWith({PASSWORD})).exitCode, 2);
+}
+
+TEST_F(PasswordTest, IsNotTakenFromAFileThatEverybodyCanRead) {
+  testsupport::SetMode(PASSWORD_FILE, 0644);
+  const Outcome outcome = Velmorctl(JoinWith({"--password-file", PASSWORD_FILE}));
+  EXPECT_EQ(outcome.exitCode, 2);
+  EXPECT_NE(outcome.errors.find("chmod 600"), std::string::npos) << outcome.errors;
+}
+
+TEST_F(PasswordTest, IsMissingWhenTheFileIs) {
+  const Outcome outcome = Velmorctl(JoinWith({"--password-file", "/run/no-such-file"}));
+  EXPECT_EQ(outcome.exitCode, 2);
+  EXPECT_NE(outcome.errors.find("'/run/no-such-file': No such file or directory"), std::string::npos)
+      << outcome.errors;
+}
+
+TEST_F(PasswordTest, IsMissingWhenTheDescriptorIsNotOpen) {
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-fd", "77"})).exitCode, 2);
+}
+
+TEST_F(PasswordTest, MustNotBeEmpty) {
+  testsupport::WriteFile(PASSWORD_FILE, "\n");
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-file", PASSWORD_FILE})).exitCode, 6);
+}
+
+TEST_F(PasswordTest, MustNotHoldANullCharacter) {
+  testsupport::WriteFile(PASSWORD_FILE, std::string("half\0other", 10));
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-file", PASSWORD_FILE})).exitCode, 2);
+}
+
+TEST_F(PasswordTest, MustNotBeTooLong) {
+  testsupport::WriteFile(PASSWORD_FILE, std::string(4001, 'a'));
+  EXPECT_EQ(Velmorctl(JoinWith({"--password-file", PASSWORD_FILE})).exitCode, 2);
+}
+
+TEST_F(PasswordTest, NeedsATerminalWhenNoSourceIsGiven) {
+  const Outcome outcome = Velmorctl(JOIN_AT_TERMINAL);
+  EXPECT_EQ(outcome.exitCode, 2);
+  EXPECT_NE(outcome.errors.find("there is no terminal"), std::string::npos) << outcome.errors;
+}
+
+TEST_F(PasswordTest, IsAskedForWithoutEcho) {
+  TerminalSession session(JOIN_AT_TERMINAL);
+  ASSERT_TRUE(session.AwaitText("Password of alice: "));
+  EXPECT_FALSE(session.Echoes());
+  session.Type(PASSWORD + "\n");
+  const Outcome outcome = session.Wait();
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.output;
+  EXPECT_TRUE(Called(JOIN_CALL));
+  EXPECT_EQ(outcome.output.find(PASSWORD), std::string::npos);
+  EXPECT_TRUE(session.Echoes());
+}
+
+TEST_F(PasswordTest, PromptRestoresTheTerminalOnControlC) {
+  TerminalSession session(JOIN_AT_TERMINAL);
+  ASSERT_TRUE(session.AwaitText("Password of alice: "));
+  session.Type("half\x03");
+  const Outcome outcome = session.Wait();
+  EXPECT_EQ(outcome.signalNumber, SIGINT);
+  EXPECT_TRUE(session.Echoes());
+  EXPECT_FALSE(Called(JOIN_CALL));
+}
+
+class PromptSignalTest : public PasswordTest, public ::testing::WithParamInterface<int> {};
+
+TEST_P(PromptSignalTest, RestoresTheTerminalAndEndsByTheSignal) {
+  TerminalSession session(JOIN_AT_TERMINAL);
+  ASSERT_TRUE(session.AwaitText("Password of alice: "));
+  session.Signal(GetParam());
+  EXPECT_EQ(session.Wait().signalNumber, GetParam());
+  EXPECT_TRUE(session.Echoes());
+}
+
+INSTANTIATE_TEST_SUITE_P(Each, PromptSignalTest, ::testing::Values(SIGINT, SIGTERM, SIGHUP, SIGQUIT),
+                         [](const auto& test) { return std::string(sigabbrev_np(test.param)); });
+
+TEST_F(PasswordTest, PromptRestoresTheTerminalWhileItIsStoppedAndAsksAgain) {
+  TerminalSession session(JOIN_AT_TERMINAL);
+  ASSERT_TRUE(session.AwaitText("Password of alice: "));
+  session.Type("half\x1a");
+  ASSERT_TRUE(session.AwaitStop());
+  EXPECT_TRUE(session.Echoes());
+  session.Signal(SIGCONT);
+  ASSERT_TRUE(session.AwaitText("Password of alice: \r\nPassword of alice: "));
+  EXPECT_FALSE(session.Echoes());
+  session.Type(PASSWORD + "\n");
+  EXPECT_EQ(session.Wait().exitCode, 0);
+  EXPECT_TRUE(Called(JOIN_CALL));
+}
+
+TEST_F(PasswordTest, PromptRestoresTheTerminalAtTheEndOfInput) {
+  TerminalSession session(JOIN_AT_TERMINAL);
+  ASSERT_TRUE(session.AwaitText("Password of alice: "));
+  session.Type("\x04");
+  EXPECT_EQ(session.Wait().exitCode, 2);
+  EXPECT_TRUE(session.Echoes());
+}
+
+TEST_F(PasswordTest, PromptRestoresTheTerminalWhenThePasswordIsTooLong) {
+  TerminalSession session(JOIN_AT_TERMINAL);
+  ASSERT_TRUE(session.AwaitText("Password of alice: "));
+  // A terminal takes 4095 characters to a line.
+  session.Type(std::string(4050, 'a') + "\n");
+  EXPECT_EQ(session.Wait().exitCode, 2);
+  EXPECT_TRUE(session.Echoes());
+}
+
+TEST_F(PasswordTest, StandsNeitherInTheCommandLineNorInTheEnvironment) {
+  Script("hang.joinDomain", "");
+  RunningProgram join(JoinWith({"--password-fd", "10"}), WithDescriptor(PASSWORD));
+  ASSERT_TRUE(Eventually([] { return Called(JOIN_CALL); }));
+  const std::string process = "/proc/" + std::to_string(join.Process());
+  EXPECT_NE(Raw(process + "/cmdline").find("corp.example"), std::string::npos);
+  EXPECT_EQ(Raw(process + "/cmdline").find(PASSWORD), std::string::npos);
+  EXPECT_FALSE(Raw(process + "/environ").empty());
+  EXPECT_EQ(Raw(process + "/environ").find(PASSWORD), std::string::npos);
+}
+
+TEST_F(PasswordTest, IsWipedFromMemoryAfterTheJoin) {
+  Script("hang.joinDomain", "");
+  Script("hang.getDomainTrustState", "");
+  RunningProgram join(JoinWith({"--password-file", PASSWORD_FILE}));
+  ASSERT_TRUE(Eventually([] { return Called(JOIN_CALL); }));
+  ASSERT_TRUE(MemoryHolds(join.Process(), PASSWORD));
+  RemoveScript("hang.joinDomain");
+  ASSERT_TRUE(Eventually([] { return Called("getDomainTrustState"); }));
+  EXPECT_FALSE(MemoryHolds(join.Process(), PASSWORD));
+}
+
+TEST_F(PasswordTest, StandsInNoMessage) {
+  Script("status.joinDomain", "86");
+  const Outcome outcome = Velmorctl(JoinWith({"--password-file", PASSWORD_FILE}));
+  EXPECT_EQ((outcome.output + outcome.errors).find(PASSWORD), std::string::npos);
+}
+
+}  // namespace
+
+}  // namespace velmorctltest
