@@ -26,7 +26,8 @@ std::string Normalized(const std::string& dn) {
   if (ldap_dn2str(parts, &text, LDAP_DN_FORMAT_LDAPV3 | LDAP_DN_PRETTY) != LDAP_SUCCESS) return "";
   const std::string result = text;
   ldap_memfree(text);
-  return result;
+  // The library takes a part without a name. Inside a name both characters would be escaped.
+  return result.find("=,") == std::string::npos ? result : "";
 }
 
 std::string FirstType(std::string_view part) {
