@@ -28,6 +28,11 @@ if readelf --dynamic "$library" | grep -E 'NODELETE|TEXTREL'; then
   echo "the library cannot be unloaded, or is changed when it is loaded" >&2
   status=1
 fi
+# Not safe on several threads, or a way to run a shell.
+if nm -D --undefined-only "$library" | grep -E ' (strerror|strtok|localtime|gmtime|system|popen|tmpnam)(@|$)'; then
+  echo "the library must not call these" >&2
+  status=1
+fi
 soname=$(readelf --dynamic "$library" | sed -n 's/.*Library soname: \[\(.*\)\]/\1/p')
 if [[ $soname != libvelmor.so.1 ]]; then
   echo "the library calls itself '$soname'" >&2

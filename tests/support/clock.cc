@@ -24,6 +24,7 @@ constinit Interposed<int(useconds_t)> realUsleep("usleep");
 constinit std::atomic<bool> sleepsAreFaked{false};
 constinit std::atomic<long> wallClockSeconds{0};
 constinit std::atomic<long> monotonicNanoseconds{0};
+constinit std::atomic<int> wallClockReads{0};
 constinit std::mutex sleepsMutex;
 
 constexpr long NANOSECONDS_PER_SECOND = 1'000'000'000;
@@ -52,6 +53,7 @@ std::chrono::nanoseconds DurationOf(const timespec& time) {
 FakeClock::FakeClock() {
   const std::lock_guard lock(sleepsMutex);
   RecordedSleeps().clear();
+  wallClockReads = 0;
   sleepsAreFaked = true;
 }
 
@@ -69,6 +71,10 @@ void FakeClock::MoveMonotonicClock(std::chrono::nanoseconds distance) {
   monotonicNanoseconds += distance.count();
 }
 
+int FakeClock::WallClockReads() const {
+  return wallClockReads;
+}
+
 std::vector<std::chrono::nanoseconds> FakeClock::Sleeps() const {
   const std::lock_guard lock(sleepsMutex);
   return RecordedSleeps();
@@ -79,6 +85,7 @@ std::vector<std::chrono::nanoseconds> FakeClock::Sleeps() const {
 INTERPOSED int gettimeofday(timeval* __restrict now, void* __restrict zone) noexcept {
   const int result = testsupport::realGettimeofday.Real(now, zone);
   now->tv_sec += testsupport::wallClockSeconds;
+  ++testsupport::wallClockReads;
   return result;
 }
 

@@ -23,6 +23,9 @@ class FakeClock {
   /// Moves what clock_gettime(CLOCK_MONOTONIC) tells.
   void MoveMonotonicClock(std::chrono::nanoseconds distance);
 
+  /// How often the process has asked gettimeofday() since this exists.
+  int WallClockReads() const;
+
   /// The sleeps so far, in order, of all threads.
   std::vector<std::chrono::nanoseconds> Sleeps() const;
 };

@@ -2,8 +2,10 @@
 
 #include <cstdarg>
 #include <cstdio>
+#include <cstdlib>
 #include <mutex>
 #include <ostream>
+#include <utility>
 
 #define INTERPOSED extern "C" __attribute__((visibility("default")))
 
@@ -16,18 +18,32 @@ namespace {
 
 constinit std::mutex recordMutex;
 
-/// Never destroyed: threads may still log while the process ends.
+// Both are never destroyed: threads may still log while the process ends.
 std::vector<LogLine>& Record() {
   static auto* record = new std::vector<LogLine>;
   return *record;
 }
 
+std::function<void(const LogLine&)>& Observer() {
+  static auto* observer = new std::function<void(const LogLine&)>;
+  return *observer;
+}
+
 __attribute__((format(printf, 2, 0))) void AddLine(int priority, const char* format, va_list arguments) {
   char* text = nullptr;
-  if (vasprintf(&text, format, arguments) >= 0) {
+  if (vasprintf(&text, format, arguments) < 0) {
+    return;
+  }
+  const LogLine line{priority, text};
+  std::free(text);
+  std::function<void(const LogLine&)> observer;
+  {
     const std::lock_guard lock(recordMutex);
-    Record().push_back({priority, text});
-    free(text);
+    Record().push_back(line);
+    observer = Observer();
+  }
+  if (observer) {
+    observer(line);
   }
 }
 
@@ -45,6 +61,11 @@ std::vector<LogLine> RecordedLog() {
 void ForgetLog() {
   const std::lock_guard lock(recordMutex);
   Record().clear();
+}
+
+void ObserveLog(std::function<void(const LogLine&)> observer) {
+  const std::lock_guard lock(recordMutex);
+  Observer() = std::move(observer);
 }
 
 }  // namespace testsupport

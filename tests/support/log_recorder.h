@@ -4,6 +4,7 @@
 
 #include <syslog.h>
 
+#include <functional>
 #include <iosfwd>
 #include <string>
 #include <vector>
@@ -25,6 +26,9 @@ std::vector<LogLine> RecordedLog();
 
 /// Forgets the lines so far.
 void ForgetLog();
+
+/// Calls `observer` with each later line, on the thread that writes it; an empty one ends that.
+void ObserveLog(std::function<void(const LogLine&)> observer);
 
 }  // namespace testsupport
 

@@ -66,6 +66,15 @@ TEST(LogRecorderTest, KeepsPriorityAndFormattedText) {
   EXPECT_TRUE(RecordedLog().empty());
 }
 
+TEST(LogRecorderTest, AnObserverSeesEachLine) {
+  std::vector<std::string> seen;
+  ObserveLog([&](const LogLine& line) { seen.push_back(line.text); });
+  syslog(LOG_INFO, "first");
+  ObserveLog(nullptr);
+  syslog(LOG_INFO, "second");
+  EXPECT_EQ(seen, (std::vector<std::string>{"first"}));
+}
+
 TEST(InterposeTest, ATestAnswersACallOnlyWithinItsScope) {
   char name[65] = {};
   {

@@ -5,6 +5,7 @@
 
 #include <atomic>
 #include <chrono>
+#include <functional>
 #include <memory>
 #include <optional>
 #include <stdexcept>
@@ -235,6 +236,32 @@ TEST_F(CacheRefreshTest, FetchingTheTrustStateReportsItsOutcome) {
   script_.getDomainTrustState = []() -> TrustState { throw AccessDeniedException(); };
   EXPECT_FALSE(store_.FetchDomainTrustState());
   EXPECT_EQ(RecordedLog(), (Lines{{LOG_ERR, "Failed to get domain trust state: " + DENIED}}));
+}
+
+TEST_F(CacheRefreshTest, WhatIsNotALibraryExceptionLeavesTheFetchOfServices) {
+  script_.getSmartCardEnabledServices = [](auto...) -> std::uint32_t { throw std::out_of_range("inside"); };
+  EXPECT_THROW(store_.FetchScEnabledSvcs(), std::out_of_range);
+  EXPECT_TRUE(RecordedLog().empty());
+}
+
+TEST_F(CacheRefreshTest, WhatIsNotALibraryExceptionLeavesTheFetchOfTheTrustState) {
+  VelmorThreadUtil::SetScheduler([](std::function<void()>) { throw std::out_of_range("pool is full"); });
+  EXPECT_THROW(store_.FetchDomainTrustState(), std::out_of_range);
+  VelmorThreadUtil::SetScheduler(nullptr);
+  EXPECT_TRUE(RecordedLog().empty());
+}
+
+TEST_F(CacheRefreshTest, AnyStandardExceptionIsCaughtByTheOtherFetches) {
+  cache_.SetTrustedDomains({Domain("a.test", "A")});
+  VelmorThreadUtil::SetScheduler([](std::function<void()>) { throw std::out_of_range("pool is full"); });
+  EXPECT_FALSE(store_.FetchAdConfig());
+  EXPECT_FALSE(store_.FetchTrustedDomains());
+  EXPECT_FALSE(store_.FetchTrustRelationships());
+  VelmorThreadUtil::SetScheduler(nullptr);
+  EXPECT_EQ(RecordedLog(), (Lines{{LOG_ERR, "Failed to get AD config: pool is full"},
+                                  {LOG_ERR, "Failed to get trusted domains: pool is full"},
+                                  {LOG_ERR, "Failed to get trust relationship for : pool is full"},
+                                  {LOG_ERR, "Failed to get trust relationship for a.test: pool is full"}}));
 }
 
 TEST_F(CacheRefreshTest, FetchingTrustedDomainsReportsItsOutcome) {

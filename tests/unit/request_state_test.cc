@@ -82,6 +82,20 @@ TEST(RequestStateTest, DoneTakesTheFailureOver) {
   EXPECT_EQ(failure, nullptr);
 }
 
+TEST(RequestStateTest, ASecondSuccessLeavesTheStoredFailure) {
+  RequestState state;
+  state.Done(std::make_unique<IOError>("failed"));
+  state.Done(nullptr);
+  EXPECT_THROW_WHAT(state.WaitResult(60), IOError, "failed");
+}
+
+TEST(RequestStateTest, ASecondFailureReplacesTheStoredOne) {
+  RequestState state;
+  state.Done(std::make_unique<IOError>("failed"));
+  state.Done(std::make_unique<ConfigurationError>("failed otherwise"));
+  EXPECT_THROW_WHAT(state.WaitResult(60), ConfigurationError, "failed otherwise");
+}
+
 /// Starts waiters, and lets them all reach the wait before it goes on.
 class Waiters {
  public:
@@ -199,6 +213,31 @@ TEST(RequestStateTest, TheDeadlineIsTheWallClockPlusTheTimeOut) {
   EXPECT_LE(deadline.tv_sec, after.tv_sec + 25);
   EXPECT_EQ(deadline.tv_nsec % 1000, 0);
   EXPECT_LT(deadline.tv_nsec, 1'000'000'000);
+}
+
+TEST(RequestStateTest, TheDeadlineIsReadBeforeTheLockIsTaken) {
+  RequestState state;
+  FakeClock clock;
+  std::vector<timespec> deadlines;
+  std::thread second;
+  const TakeOver look(testsupport::calls::pthreadCondTimedwait, [&](pthread_cond_t*, pthread_mutex_t*,
+                                                                    const timespec* deadline) {
+    deadlines.push_back(*deadline);
+    if (deadlines.size() == 1) {
+      // This waiter holds the lock. The second one must have read the clock all the same.
+      second = std::thread([&] { EXPECT_THROW(state.WaitResult(60), ProviderCallTimedOutException); });
+      const auto limit = std::chrono::steady_clock::now() + std::chrono::seconds(20);
+      while (clock.WallClockReads() < 2 && std::chrono::steady_clock::now() < limit) {
+        std::this_thread::yield();
+      }
+      clock.MoveWallClock(std::chrono::hours(1));
+    }
+    return ETIMEDOUT;
+  });
+  EXPECT_THROW(state.WaitResult(60), ProviderCallTimedOutException);
+  second.join();
+  ASSERT_EQ(deadlines.size(), 2U);
+  EXPECT_LT(deadlines[1].tv_sec, deadlines[0].tv_sec + 3600);
 }
 
 TEST(RequestStateTest, AMovedWallClockEndsAWaitAtOnce) {

@@ -302,6 +302,26 @@ TEST_F(StatusQueryTest, ALateTrustStateIsTwoAndStaysTwoUntilTheWorkerEnds) {
   EXPECT_EQ(cache_.GetDomainTrustState(), 4711U);
 }
 
+TEST_F(StatusQueryTest, TheCachedTrustStateIsSetAfterTheLogLine) {
+  cache_.SetDomainTrustState(TRUST_STATE_HEALTHY);
+  std::vector<TrustState> states;
+  testsupport::ObserveLog([&](const LogLine&) { states.push_back(cache_.GetDomainTrustState()); });
+  script_.getDomainTrustState = [this] {
+    gate_.Pass();
+    return TRUST_STATE_HEALTHY;
+  };
+  script_.getTrustedDomains = [this](auto*** domains, auto* release) {
+    gate_.Pass();
+    return Answer(domains, release, std::vector<NamePair>());
+  };
+  Hang();
+  store_.GetDomainTrustState();
+  EXPECT_EQ(states, (std::vector<TrustState>{TRUST_STATE_HEALTHY, TRUST_STATE_HEALTHY}));
+  EXPECT_EQ(cache_.GetDomainTrustState(), 2U);
+  testsupport::ObserveLog(nullptr);
+  WorkersEnd();
+}
+
 TEST_F(StatusQueryTest, AQuestionAfterALateOneAttachesToTheSameRequest) {
   script_.getTrustedDomains = [this](auto*** domains, auto* release) {
     ++calls_;
