@@ -1,0 +1,22 @@
+# Completion of velmorctl for bash.
+_velmorctl() {
+  local word=${COMP_WORDS[COMP_CWORD]} words=
+  case ${COMP_CWORD}:${COMP_WORDS[1]}:${COMP_WORDS[2]} in
+    1:*) words="status join leave trust store provider dc smartcard cam option" ;;
+    2:trust:*) words="show list" ;;
+    2:store:* | 2:provider:*) words="list show use" ;;
+    2:dc:*) words="show prefer" ;;
+    2:smartcard:*) words="list set" ;;
+    2:cam:*) words="discover trust show forget test" ;;
+    2:option:*) words="get set" ;;
+    3:store:use) words="None Active\ Directory" ;;
+    *:join:* | *:leave:*) words="-U --password-file --password-fd --proxy" ;;
+    *) words="--json --timeout" ;;
+  esac
+  if [[ ${COMP_WORDS[COMP_CWORD - 1]} == --password-file ]]; then
+    mapfile -t COMPREPLY < <(compgen -f -- "$word")
+  else
+    mapfile -t COMPREPLY < <(compgen -W "$words" -- "$word")
+  fi
+}
+complete -F _velmorctl velmorctl
