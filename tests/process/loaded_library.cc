@@ -1,7 +1,9 @@
 #include "process/loaded_library.h"
 
 #include <dlfcn.h>
+#include <unistd.h>
 
+#include <sstream>
 #include <stdexcept>
 #include <thread>
 
@@ -13,8 +15,19 @@ namespace {
 
 using quenix::authentication::AuthenticationStore;
 
-/// A sanitizer may run a thread of its own.
-const std::size_t THREADS_AT_START = ThreadCount();
+/// How many threads the process has when it runs none of its own: a sanitizer may start one along with the
+/// first that the process starts.
+std::size_t CountIdleThreads() {
+  pid_t first = 0;
+  std::thread([&first] { first = gettid(); }).join();
+  // A thread that has been joined may still be on its way out.
+  while (Exists("/proc/self/task/" + std::to_string(first))) {
+    std::this_thread::yield();
+  }
+  return ThreadCount();
+}
+
+const std::size_t IDLE_THREADS = CountIdleThreads();
 
 /// Room for an object of a class whose constructor is called by its address; larger than it needs.
 constexpr std::size_t STORE_ROOM = 256;
@@ -75,7 +88,14 @@ std::unique_ptr<AuthenticationStore> LoadedLibrary::CreateActiveDirectoryStore(i
 }
 
 bool LibraryIsMapped() {
-  return ReadFile("/proc/self/maps").find("/libvelmor.so") != std::string::npos;
+  // Its code: a sanitizer that has symbolised something keeps the file mapped for reading.
+  std::istringstream maps(ReadFile("/proc/self/maps"));
+  for (std::string line; std::getline(maps, line);) {
+    if (line.find(" r-xp ") != std::string::npos && line.find("/libvelmor.so") != std::string::npos) {
+      return true;
+    }
+  }
+  return false;
 }
 
 std::size_t ThreadCount() {
@@ -83,7 +103,7 @@ std::size_t ThreadCount() {
 }
 
 void AwaitEndOfWorkers() {
-  while (ThreadCount() > THREADS_AT_START) {
+  while (ThreadCount() > IDLE_THREADS) {
     std::this_thread::yield();
   }
 }

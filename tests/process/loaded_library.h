@@ -41,7 +41,7 @@ bool LibraryIsMapped();
 /// How many threads the process has.
 std::size_t ThreadCount();
 
-/// Waits until this thread is the only one, but for those that the process had at its start.
+/// Waits until the process runs no thread of its own but this one.
 void AwaitEndOfWorkers();
 
 }  // namespace testsupport

@@ -79,7 +79,7 @@ class UnloadingGate {
 
 TEST(UnloadingTest, AWorkerInsideTheLibraryKeepsItMapped) {
   Script& script = UseScriptedPlugin();
-  Gate call;
+  static Gate& call = *new Gate;  // Never destroyed: nothing tells when a worker has left it.
   Gate unloading;
   script.getActiveDomain = [&](auto* domain, auto* release) {
     call.Pass();
@@ -102,7 +102,7 @@ TEST(UnloadingTest, AWorkerInsideTheLibraryKeepsItMapped) {
 
 TEST(UnloadingTest, AWorkerInsideThePluginKeepsTheLibraryMapped) {
   Script& script = UseScriptedPlugin();
-  Gate call;
+  static Gate& call = *new Gate;  // Never destroyed: nothing tells when a worker has left it.
   script.getActiveDomain = [&](auto* domain, auto* release) {
     call.Pass();
     return Answer(domain, release, {"", ""});
@@ -133,7 +133,7 @@ TEST(UnloadingTest, AWaiterThatHasWokenMayUnloadAtOnce) {
 
 TEST(UnloadingTest, ALibraryThatIsLoadedAgainWhileAWorkerRunsIsTheSame) {
   Script& script = UseScriptedPlugin();
-  Gate call;
+  static Gate& call = *new Gate;  // Never destroyed: nothing tells when a worker has left it.
   script.getActiveDomain = [&](auto* domain, auto* release) {
     call.Pass();
     return Answer(domain, release, {"", ""});

@@ -5,17 +5,52 @@
 
 #include <cerrno>
 #include <cstdlib>
+#include <cstring>
 
 #define INTERPOSED extern "C" __attribute__((visibility("default")))
 
 namespace testsupport {
 
-void* FindRealFunction(const char* name) {
+namespace {
+
+void* FindInNextObject(const char* name) {
   void* function = dlsym(RTLD_NEXT, name);
   if (function == nullptr) {
     std::abort();
   }
   return function;
+}
+
+/// Held around the loader's own lock, which ThreadSanitizer does not see; recursive, as that is.
+pthread_mutex_t loaderMutex = PTHREAD_RECURSIVE_MUTEX_INITIALIZER_NP;
+
+template <class Result, class... Arguments>
+Result CallLoader(const char* name, Arguments... arguments) {
+  const auto function = reinterpret_cast<Result (*)(Arguments...)>(FindInNextObject(name));
+  pthread_mutex_lock(&loaderMutex);
+  const Result result = function(arguments...);
+  pthread_mutex_unlock(&loaderMutex);
+  return result;
+}
+
+void* RealDlopen(const char* path, int flags) {
+  return CallLoader<void*>("dlopen", path, flags);
+}
+
+int RealDlclose(void* handle) {
+  return CallLoader<int>("dlclose", handle);
+}
+
+}  // namespace
+
+void* FindRealFunction(const char* name) {
+  if (std::strcmp(name, "dlopen") == 0) {
+    return reinterpret_cast<void*>(&RealDlopen);
+  }
+  if (std::strcmp(name, "dlclose") == 0) {
+    return reinterpret_cast<void*>(&RealDlclose);
+  }
+  return FindInNextObject(name);
 }
 
 namespace calls {

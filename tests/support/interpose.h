@@ -7,6 +7,7 @@
 
 #include <netdb.h>
 #include <pthread.h>
+#include <sched.h>
 #include <sys/stat.h>
 #include <sys/types.h>
 
@@ -42,20 +43,36 @@ class Interposed<Result(Arguments...)> {
 
   /// What the interposed function runs.
   Result Call(Arguments... arguments) {
-    const Handler* handler = handler_.load(std::memory_order_acquire);
-    return handler != nullptr ? (*handler)(arguments...) : Real(arguments...);
+    ++threadsInHandler_;
+    const Handler* handler = handler_.load();
+    if (handler == nullptr) {
+      --threadsInHandler_;
+      return Real(arguments...);
+    }
+    struct Leave {
+      std::atomic<int>& threads;
+      ~Leave() { --threads; }
+    } const leave{threadsInHandler_};
+    return (*handler)(arguments...);
   }
 
-  void Use(const Handler* handler) { handler_.store(handler, std::memory_order_release); }
+  /// Null gives the function back, and waits until every thread has left the handler.
+  void Use(const Handler* handler) {
+    handler_.store(handler);
+    while (handler == nullptr && threadsInHandler_.load() != 0) {
+      sched_yield();
+    }
+  }
 
  private:
   const char* name_;
   std::atomic<void*> real_{nullptr};
   std::atomic<const Handler*> handler_{nullptr};
+  std::atomic<int> threadsInHandler_{0};
 };
 
-/// Takes a function over until the end of the scope. The handler may call Real() of the same function. No
-/// other thread may still be in the function when the scope ends.
+/// Takes a function over until the end of the scope, which waits for the threads that are in the handler. The
+/// handler may call Real() of the same function.
 template <class Signature>
 class TakeOver {
  public:

@@ -12,6 +12,14 @@ const char* __asan_default_options() {
 }
 #endif
 
+#ifdef __SANITIZE_THREAD__
+// The loader's memory is guarded by a lock that the sanitizer does not see.
+extern "C" __attribute__((visibility("default"))) const char* __tsan_default_suppressions();
+const char* __tsan_default_suppressions() {
+  return "called_from_lib:ld-linux-x86-64.so.2\nrace:_dl_close_worker\n";
+}
+#endif
+
 int main(int count, char** arguments) {
   ::testing::InitGoogleTest(&count, arguments);
   if (!::testing::GTEST_FLAG(list_tests) && !testsupport::InSandbox()) {
