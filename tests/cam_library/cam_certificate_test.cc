@@ -34,8 +34,8 @@ class CAMCertificateTest : public testing::Test {
 
   /// A new certificate, as a PEM text.
   std::string NewCertificate(const std::string& algorithm) {
-    OutputOf("openssl req -x509 -nodes -newkey " + algorithm + " -subj /CN=cam -days 1 -keyout /dev/null -out " +
-        path_ + " 2>/dev/null");
+    OutputOf("openssl req -x509 -nodes -newkey " + algorithm +
+             " -subj /CN=cam -days 1 -keyout /dev/null -out " + path_ + " 2>/dev/null");
     return ReadFile(path_);
   }
 

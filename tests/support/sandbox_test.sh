@@ -1,5 +1,7 @@
 #!/bin/sh
 # sandbox_test.sh VELMOR-SANDBOX: what a program changes in the sandbox must not be seen on the machine.
+# The commands in single quotes are expanded inside the sandbox.
+# shellcheck disable=SC2016
 set -eu
 sandbox=$1
 
@@ -79,6 +81,7 @@ kill -KILL $launcher
 wait $launcher || true
 # The kernel kills the rest at once; the file's last user is gone when nobody holds it open any more.
 tries=0
+# shellcheck disable=SC2010 # the targets of the links are wanted, not the names
 while ls -l /proc/[0-9]*/fd 2>/dev/null | grep -qF "$marker"; do
   tries=$((tries + 1))
   [ $tries -lt 200 ] || fail "a killed launcher left processes behind"
