@@ -4,7 +4,9 @@
 
 #include <fcntl.h>
 #include <gtest/gtest.h>
+#include <poll.h>
 #include <signal.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -21,6 +23,31 @@ using std::chrono::seconds;
 using End = Conversation::End;
 
 constexpr seconds LONG{50};
+
+// A named pipe that programs hold open; its end is seen when none of them is left, so it needs no process
+// ids.
+class Lifeline {
+ public:
+  explicit Lifeline(const std::string& path) {
+    if (mkfifo(path.c_str(), 0600) == 0) descriptor_ = open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC);
+    EXPECT_GE(descriptor_, 0);
+  }
+  Lifeline(const Lifeline&) = delete;
+  Lifeline& operator=(const Lifeline&) = delete;
+  ~Lifeline() { close(descriptor_); }
+
+  // Comes back only when no program holds it any more.
+  void AwaitEndOfHolders() const {
+    char byte = 0;
+    while (read(descriptor_, &byte, 1) != 0) {
+      pollfd entry = {descriptor_, POLLIN, 0};
+      poll(&entry, 1, -1);
+    }
+  }
+
+ private:
+  int descriptor_ = -1;
+};
 
 class ChildTest : public testing::Test {
  protected:
@@ -78,16 +105,15 @@ TEST_F(ChildTest, HalfALineIsNoAnswer) {
 }
 
 TEST_F(ChildTest, AChildThatHangsIsEndedAtTheDeadline) {
-  EXPECT_EQ(Talk("echo $$ > $(dirname $0)/process; sleep 1000 & wait", "", milliseconds(300)).end,
-            End::kDeadline);
-  EXPECT_TRUE(IsGone("process"));
+  const Lifeline lifeline(folder_.Path() + "lifeline");
+  EXPECT_EQ(Talk("exec 3> $(dirname $0)/lifeline; exec sleep 1000", "", seconds(1)).end, End::kDeadline);
+  lifeline.AwaitEndOfHolders();
 }
 
 TEST_F(ChildTest, ItsOwnChildrenEndWithIt) {
-  EXPECT_EQ(Talk("sleep 1000 & echo $! > $(dirname $0)/grandchild; wait", "", milliseconds(500)).end,
-            End::kDeadline);
-  // Ending is asynchronous, but SIGKILL has been sent.
-  while (!IsGone("grandchild")) usleep(1000);
+  const Lifeline lifeline(folder_.Path() + "lifeline");
+  EXPECT_EQ(Talk("sleep 1000 3> $(dirname $0)/lifeline & wait", "", seconds(1)).end, End::kDeadline);
+  lifeline.AwaitEndOfHolders();
 }
 
 TEST_F(ChildTest, WhatItLeavesBehindInItsSessionEndsAfterItsAnswer) {

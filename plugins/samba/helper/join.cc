@@ -78,10 +78,10 @@ class Membership {
     });
   }
 
-  void CreateKeytab() {
+  void CreateKeytab(const std::string& controller) {
     StopWhenCallerHasGone();
-    call_.log.Run("keytab", "making the keytab", [] {
-      MakeKeytab();
+    call_.log.Run("keytab", "making the keytab", [&] {
+      MakeKeytab(controller);
       return std::string("made ") + paths::kKeytab;
     });
   }
@@ -167,7 +167,7 @@ std::string Join(const Call& call) {
     });
     membership.StoreSecrets(blob);
     blob = Secret();
-    membership.CreateKeytab();
+    membership.CreateKeytab(found.controller);
     membership.StartService();
     membership.Finish(found.accountDn.empty() ? FindAccountDn(logon) : found.accountDn);
   } catch (...) {

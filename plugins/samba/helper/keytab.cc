@@ -49,7 +49,7 @@ void RefreshKeytab(const Call& call, int64_t passwordTime) {
   const auto age = std::chrono::seconds(time(nullptr) - passwordTime);
   if (!keytabTime || passwordTime >= *keytabTime) {
     call.log.Run("keytab", "the machine's password is newer than the keytab: making it anew", [] {
-      MakeKeytab();
+      MakeKeytab("");
       return "made";
     });
   } else if (passwordTime != 0 && age > kLongestPasswordAge) {
@@ -64,8 +64,10 @@ void RefreshKeytab(const Call& call, int64_t passwordTime) {
 
 }  // namespace
 
-void MakeKeytab() {
-  RunNet({"keytab", "create"});
+void MakeKeytab(const std::string& controller) {
+  std::vector<std::string> arguments = {"keytab", "create"};
+  if (!controller.empty()) arguments.push_back("--server=" + controller);
+  RunNet(arguments);
 }
 
 std::string FindMachineAccountDn(const std::string& computer) {

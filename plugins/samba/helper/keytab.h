@@ -6,9 +6,10 @@
 
 namespace sambaprovider {
 
-// Makes the keytab from the machine's present password. smb.conf must say that a keytab is kept. Needs a
-// controller; takes half a second, half a minute at most. Throws Failure (kInternalError) with the reason.
-void MakeKeytab();
+// Makes the keytab from the machine's present password. smb.conf must say that a keytab is kept. Asks the
+// given controller, which after a join is the only one that is sure to know the account; any one when it is
+// empty. Takes half a second, half a minute at most. Throws Failure (kInternalError) with the reason.
+void MakeKeytab(const std::string& controller);
 
 // Asks the directory for the DN of this host's computer account. Throws Failure (kInternalError).
 std::string FindMachineAccountDn(const std::string& computer);

@@ -129,8 +129,9 @@ bool IsRunning() {
 
 void Start() {
   if (SystemdRuns()) {
-    // Several joins and leaves in a row are no reason to refuse the next start.
-    SystemCtl({"reset-failed"}, kStartTime);
+    // Several joins and leaves in a row are no reason to refuse the next start. Fails for a unit that has not
+    // been loaded yet, which has no starts to forget either.
+    RunProgram({"/usr/bin/systemctl", "--quiet", "reset-failed", kUnit}, ProgramOutput::kDropped, kStartTime);
     SystemCtl({"start"}, kStartTime);
   } else {
     StartDirectly();
