@@ -16,7 +16,7 @@
 namespace sambaprovider {
 namespace {
 
-constexpr std::chrono::milliseconds kPatience{1000};
+constexpr std::chrono::milliseconds kPatience{3000};
 constexpr std::chrono::milliseconds kPause{20};
 
 }  // namespace

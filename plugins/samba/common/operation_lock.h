@@ -9,9 +9,9 @@ namespace sambaprovider {
 // Held while it exists; the kernel gives it back when the process ends, however it ends.
 class OperationLock {
  public:
-  // Makes the provider's folders when they are absent. Waits up to a second for a holder that is about to
-  // end. Throws Failure: kBusy when another holds it, kAccessDenied when the caller may not change the host,
-  // kInternalError when the lock file cannot be used.
+  // Makes the provider's folders when they are absent. Waits up to three seconds for a holder that is about
+  // to end. Throws Failure: kBusy when another holds it, kAccessDenied when the caller may not change the
+  // host, kInternalError when the lock file cannot be used.
   OperationLock();
 
  private:

@@ -83,13 +83,11 @@ std::string Refresh(const Call& call) {
   State state = LoadState();
   if (!state.joined) return "the host has joined no domain";
   RefreshKeytab(call, MachinePasswordTime(state.netbiosDomain).value_or(0));
-  if (state.machineAccountDn.empty()) {
-    call.log.Run("account", "asking for the machine account's name", [&] {
-      state.machineAccountDn = FindMachineAccountDn(state.hostName);
-      SaveState(state);
-      return state.machineAccountDn;
-    });
-  }
+  call.log.Run("account", "asking for the machine account's name", [&] {
+    state.machineAccountDn = FindMachineAccountDn(state.hostName);
+    SaveState(state);
+    return state.machineAccountDn;
+  });
   return "keytab and account name are up to date";
 }
 

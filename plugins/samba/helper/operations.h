@@ -31,8 +31,8 @@ std::string Leave(const Call& call);
 std::string PreferControllers(const Call& call);
 
 // Makes the keytab anew when the machine's password has changed since it was made, changes both when the
-// password is a week old, and learns the machine account's name when it is not known. Needs a controller when
-// there is something to do.
+// password is a week old, and learns the machine account's name, since the account may have been moved. Needs
+// a controller.
 std::string Refresh(const Call& call);
 
 // Puts an interrupted operation right. Does it on its own before every other one, too; only here the request

@@ -14,7 +14,10 @@ namespace {
 
 constexpr std::chrono::seconds kRecoveryTime{60};
 
-std::mutex oneOperation;
+// Long enough for a keytab that is being made anew, which nobody asked for, to be finished.
+constexpr std::chrono::seconds kPatience{3};
+
+std::timed_mutex oneOperation;
 
 Answer AskHelper(const Request& request, std::chrono::milliseconds limit) {
   return Ask(paths::kHelper, ChildGroup::kOwn, ChildEnvironment::kMinimal, request, limit);
@@ -30,7 +33,7 @@ void Recover(Request& request, const AttemptLog& log) {
 
 // Returns the helper's answer; throws when there is none.
 Answer AskAlone(Request& request, const AttemptLog& log) {
-  const std::unique_lock<std::mutex> lock(oneOperation, std::try_to_lock);
+  const std::unique_lock<std::timed_mutex> lock(oneOperation, kPatience);
   if (!lock.owns_lock()) throw Failure(kBusy, "this process has another join, leave or change running");
   const std::chrono::seconds limit = LoadSettings().operationTimeout;
   Answer answer = AskHelper(request, limit);
