@@ -98,11 +98,11 @@ start_node() {
   in_hub setsid --fork unshare --net --mount --uts --ipc --pid --fork --kill-child --propagation private \
     "$lab_folder/nodes/node-init" "$node" "$address" "$state" "$source_folder" \
     </dev/null >"$state/log/$node" 2>&1
-  if wait_until 20 test -s "$state/nodes/$node.new"; then
+  if wait_until 60 test -s "$state/nodes/$node.new"; then
     in_hub ip link add "v-$node" type veth peer name eth0 netns "$(cat "$state/nodes/$node.new")"
     in_hub ip link set "v-$node" master br0 up
   fi
-  wait_until 20 test -s "$state/nodes/$node" || fail "node $node did not start; see $state/log/$node"
+  wait_until 60 test -s "$state/nodes/$node" || fail "node $node did not start; see $state/log/$node"
 }
 
 # Copies the staged installation into a node, at its real places.
