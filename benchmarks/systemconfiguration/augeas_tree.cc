@@ -1,7 +1,13 @@
 #include "augeas_tree.h"
 
+#include <augeas.h>
+
 #include <stdexcept>
 #include <utility>
+
+void AugeasTree::Close::operator()(augeas* handle) const {
+  aug_close(handle);
+}
 
 AugeasTree::AugeasTree(std::string lens)
     : lens_(std::move(lens)), handle_(aug_init(nullptr, nullptr, AUG_NO_LOAD | AUG_NO_MODL_AUTOLOAD)) {

@@ -1,10 +1,10 @@
 #ifndef BENCHMARKS_SYSTEMCONFIGURATION_AUGEAS_TREE_H
 #define BENCHMARKS_SYSTEMCONFIGURATION_AUGEAS_TREE_H
 
-#include <augeas.h>
-
 #include <memory>
 #include <string>
+
+struct augeas;
 
 /// One text in an Augeas tree. Its lenses are compiled before the first text is read.
 class AugeasTree {
@@ -19,7 +19,7 @@ class AugeasTree {
 
  private:
   struct Close {
-    void operator()(augeas* handle) const { aug_close(handle); }
+    void operator()(augeas* handle) const;
   };
 
   std::string lens_;

@@ -3,8 +3,8 @@
 #include <cstddef>
 #include <cstdint>
 
-#include "differential/nss_comparison.h"
 #include "require_no_difference.h"
+#include "systemconfiguration/differential/nss_comparison.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   const differential::InputCase input = differential::FromBytes(data, size);

@@ -2,8 +2,8 @@
 #include <cstddef>
 #include <cstdint>
 
-#include "differential/pam_comparison.h"
 #include "require_no_difference.h"
+#include "systemconfiguration/differential/pam_comparison.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   const differential::InputCase input = differential::FromBytes(data, size);

@@ -5,7 +5,7 @@
 #include <iostream>
 #include <string>
 
-#include "differential/input_case.h"
+#include "systemconfiguration/differential/input_case.h"
 
 /// Ends the program, which is how a fuzzer learns of a finding.
 inline void RequireNoDifference(const std::string& difference, const differential::InputCase& input) {

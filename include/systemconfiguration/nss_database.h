@@ -10,6 +10,8 @@ namespace SystemConfiguration {
 
 /// The name of one database of the name-service switch.
 ///
+/// Converts from and to its value and its text without being asked, so that it can stand for either.
+///
 /// A plain value: distinct objects may be used by distinct threads at once; one object may be read by several
 /// threads as long as none changes it.
 class SYSTEMCONFIGURATION_EXPORT NSSDatabase {
@@ -36,10 +38,10 @@ class SYSTEMCONFIGURATION_EXPORT NSSDatabase {
   /// No database: the value is 0, which has no keyword. Assign before use.
   NSSDatabase();
 
-  NSSDatabase(Database value);
+  NSSDatabase(Database value);  // NOLINT(google-explicit-constructor)
 
   /// Reads a keyword; case matters. Throws InvalidDatabaseException for any other word.
-  NSSDatabase(const std::string& word);
+  NSSDatabase(const std::string& word);  // NOLINT(google-explicit-constructor)
 
   NSSDatabase& operator=(Database value);
 
@@ -54,10 +56,10 @@ class SYSTEMCONFIGURATION_EXPORT NSSDatabase {
 
   /// The keyword. Throws InvalidDatabaseException for values outside the enumeration. Deliberate: its message
   /// is "Invalid Database: " less as many leading characters as the value says.
-  operator std::string() const;
+  operator std::string() const;  // NOLINT(google-explicit-constructor)
 
   /// The value.
-  operator Database() const;
+  operator Database() const;  // NOLINT(google-explicit-constructor)
 
  private:
   Database value_;

@@ -10,6 +10,8 @@ namespace SystemConfiguration {
 
 /// The control field of a PAM policy line: one of six keywords, or a bracketed list of actions kept as text.
 ///
+/// Converts from and to its value and its text without being asked, so that it can stand for either.
+///
 /// A plain value: distinct objects may be used by distinct threads at once; one object may be read by several
 /// threads as long as none changes it.
 class SYSTEMCONFIGURATION_EXPORT PAMControl {
@@ -29,14 +31,14 @@ class SYSTEMCONFIGURATION_EXPORT PAMControl {
   PAMControl();
 
   /// The given value, without text.
-  PAMControl(Control value);
+  PAMControl(Control value);  // NOLINT(google-explicit-constructor)
 
   /// Stores both unchanged. Nothing checks that they fit each other.
   PAMControl(Control value, const std::string& text);
 
   /// Reads a keyword (case matters) or a bracketed control, whose whole text is kept and not examined.
   /// Throws InvalidControlException for anything else, the empty string included.
-  PAMControl(const std::string& text);
+  PAMControl(const std::string& text);  // NOLINT(google-explicit-constructor)
 
   /// Sets the value only. Deliberate: the text stays, and counts again once the value is `Bracketed`.
   PAMControl& operator=(Control value);
@@ -73,10 +75,10 @@ class SYSTEMCONFIGURATION_EXPORT PAMControl {
   /// The keyword, or a `Bracketed` control's text.
   /// Throws InvalidControlException for `Unset` and for values outside the enumeration. Deliberate: its
   /// message is "Invalid Control: " less as many leading characters as the value says.
-  operator std::string() const;
+  operator std::string() const;  // NOLINT(google-explicit-constructor)
 
   /// The value.
-  operator Control() const;
+  operator Control() const;  // NOLINT(google-explicit-constructor)
 
  private:
   Control value_;

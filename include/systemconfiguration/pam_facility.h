@@ -11,6 +11,8 @@ namespace SystemConfiguration {
 
 /// The facility (management group) of a PAM policy line.
 ///
+/// Converts from and to its value and its text without being asked, so that it can stand for either.
+///
 /// A plain value: distinct objects may be used by distinct threads at once; one object may be read by several
 /// threads as long as none changes it.
 class SYSTEMCONFIGURATION_EXPORT PAMFacility {
@@ -21,11 +23,11 @@ class SYSTEMCONFIGURATION_EXPORT PAMFacility {
   /// `Unset`.
   PAMFacility();
 
-  PAMFacility(Facility value);
+  PAMFacility(Facility value);  // NOLINT(google-explicit-constructor)
 
   /// Reads a keyword; case matters. Throws InvalidFacilityException for any other word. Deliberate: a leading
   /// '-', by which a line tolerates a missing module, is not understood.
-  PAMFacility(const std::string& word);
+  PAMFacility(const std::string& word);  // NOLINT(google-explicit-constructor)
 
   PAMFacility& operator=(Facility value);
 
@@ -40,10 +42,10 @@ class SYSTEMCONFIGURATION_EXPORT PAMFacility {
 
   /// The keyword. Throws InvalidFacilityException for `Unset` and for values outside the enumeration.
   /// Deliberate: its message is "Invalid Facility: " less as many leading characters as the value says.
-  operator std::string() const;
+  operator std::string() const;  // NOLINT(google-explicit-constructor)
 
   /// The value.
-  operator Facility() const;
+  operator Facility() const;  // NOLINT(google-explicit-constructor)
 
  private:
   Facility value_;

@@ -6,8 +6,8 @@
 #include <stdexcept>
 #include <string>
 
-#include "model_text.h"
 #include "support/expect_throw_what.h"
+#include "systemconfiguration/model_text.h"
 #include "systemconfiguration/systemconfiguration.h"
 
 namespace SystemConfiguration {
@@ -71,6 +71,14 @@ TEST(NSSConfigurationTest, ACriterionThatIsNeverClosedGoesToTheEndAndIsReadAgain
 // The character behind the blank has the index 10 and the bracket closes at 12: reading goes on at 22.
 TEST(NSSConfigurationTest, ReadingGoesOnFarBehindACriterionPerhapsInsideAWord) {
   EXPECT_EQ(RoundTrip("passwd: x [a] 45678 01cdef gh\n"), "passwd: x [a] cdef gh\n");
+}
+
+TEST(NSSConfigurationTest, PlacesAreCountedFromTheFirstCharacterThatIsNotTrimmed) {
+  EXPECT_EQ(RoundTrip("\t\r passwd: x [a] 45678 01cdef gh\n"), "passwd: x [a] cdef gh\n");
+}
+
+TEST(NSSConfigurationTest, AVerticalTabIsNotTrimmedAndCounts) {
+  EXPECT_EQ(RoundTrip("\vpasswd: x [a] 45678 01cdef gh\n"), "passwd: x [a] def gh\n");
 }
 
 TEST(NSSConfigurationTest, APlaceExactlyAtTheEndEndsTheLine) {

@@ -3,7 +3,7 @@
 #include <list>
 #include <string>
 
-#include "model_text.h"
+#include "systemconfiguration/model_text.h"
 #include "systemconfiguration/systemconfiguration.h"
 
 namespace SystemConfiguration {

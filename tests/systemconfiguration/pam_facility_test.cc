@@ -5,8 +5,8 @@
 #include <utility>
 #include <vector>
 
-#include "model_text.h"
 #include "support/expect_throw_what.h"
+#include "systemconfiguration/model_text.h"
 #include "systemconfiguration/systemconfiguration.h"
 
 namespace SystemConfiguration {

@@ -4,8 +4,8 @@
 #include <sstream>
 #include <string>
 
-#include "model_text.h"
 #include "support/expect_throw_what.h"
+#include "systemconfiguration/model_text.h"
 #include "systemconfiguration/systemconfiguration.h"
 
 namespace SystemConfiguration {

@@ -6,9 +6,9 @@
 #include <sstream>
 #include <string>
 
-#include "differential/test_streams.h"
-#include "model_text.h"
 #include "support/expect_throw_what.h"
+#include "systemconfiguration/differential/test_streams.h"
+#include "systemconfiguration/model_text.h"
 #include "systemconfiguration/systemconfiguration.h"
 
 namespace SystemConfiguration {

@@ -6,9 +6,9 @@
 #include <ostream>
 #include <string>
 
-#include "differential/input_case.h"
-#include "differential/observation.h"
-#include "differential/test_streams.h"
+#include "systemconfiguration/differential/input_case.h"
+#include "systemconfiguration/differential/observation.h"
+#include "systemconfiguration/differential/test_streams.h"
 
 namespace differential {
 

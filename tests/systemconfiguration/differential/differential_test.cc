@@ -5,10 +5,10 @@
 #include <stdexcept>
 #include <string>
 
-#include "differential/input_generator.h"
-#include "differential/nss_comparison.h"
-#include "differential/pam_comparison.h"
-#include "reference/pam_reference.h"
+#include "systemconfiguration/differential/input_generator.h"
+#include "systemconfiguration/differential/nss_comparison.h"
+#include "systemconfiguration/differential/pam_comparison.h"
+#include "systemconfiguration/reference/pam_reference.h"
 
 namespace differential {
 namespace {

@@ -1,8 +1,8 @@
-#include "differential/input_case.h"
+#include "systemconfiguration/differential/input_case.h"
 
 #include <ostream>
 
-#include "differential/observation.h"
+#include "systemconfiguration/differential/observation.h"
 
 namespace differential {
 namespace {

@@ -1,4 +1,4 @@
-#include "differential/input_generator.h"
+#include "systemconfiguration/differential/input_generator.h"
 
 #include <array>
 
@@ -82,7 +82,8 @@ std::string InputGenerator::PamLine() {
 }
 
 std::string InputGenerator::NssLine() {
-  std::string line = Pick(databases) + (OneIn(20) ? Separator() : "") + ":" + (OneIn(20) ? "" : Separator());
+  std::string line = (OneIn(8) ? Separator() : "") + Pick(databases) + (OneIn(20) ? Separator() : "") + ":" +
+                     (OneIn(20) ? "" : Separator());
   for (std::size_t count = Below(7); count > 0; --count) {
     line += Pick(services);
     if (OneIn(4)) line += Separator() + Pick(criteria);

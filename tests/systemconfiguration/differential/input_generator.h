@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "differential/input_case.h"
+#include "systemconfiguration/differential/input_case.h"
 
 namespace differential {
 

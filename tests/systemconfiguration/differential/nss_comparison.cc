@@ -1,9 +1,9 @@
-#include "differential/nss_comparison.h"
+#include "systemconfiguration/differential/nss_comparison.h"
 
 #include <sstream>
 
-#include "differential/comparison.h"
-#include "reference/nss_reference.h"
+#include "systemconfiguration/differential/comparison.h"
+#include "systemconfiguration/reference/nss_reference.h"
 #include "systemconfiguration/systemconfiguration.h"
 
 namespace differential {

@@ -4,7 +4,7 @@
 
 #include <string>
 
-#include "differential/input_case.h"
+#include "systemconfiguration/differential/input_case.h"
 
 namespace differential {
 

@@ -1,12 +1,12 @@
-#include "differential/observation.h"
+#include "systemconfiguration/differential/observation.h"
 
 #include <array>
 #include <cstdio>
 #include <stdexcept>
 
-#include "differential/test_streams.h"
-#include "reference/nss_reference.h"
-#include "reference/pam_reference.h"
+#include "systemconfiguration/differential/test_streams.h"
+#include "systemconfiguration/reference/nss_reference.h"
+#include "systemconfiguration/reference/pam_reference.h"
 #include "systemconfiguration/systemconfiguration.h"
 
 namespace differential {

@@ -1,9 +1,9 @@
-#include "differential/pam_comparison.h"
+#include "systemconfiguration/differential/pam_comparison.h"
 
 #include <sstream>
 
-#include "differential/comparison.h"
-#include "reference/pam_reference.h"
+#include "systemconfiguration/differential/comparison.h"
+#include "systemconfiguration/reference/pam_reference.h"
 #include "systemconfiguration/systemconfiguration.h"
 
 namespace differential {

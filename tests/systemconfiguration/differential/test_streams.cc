@@ -1,4 +1,4 @@
-#include "differential/test_streams.h"
+#include "systemconfiguration/differential/test_streams.h"
 
 #include <algorithm>
 #include <vector>

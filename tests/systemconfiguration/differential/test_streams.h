@@ -9,7 +9,7 @@
 #include <streambuf>
 #include <string>
 
-#include "differential/input_case.h"
+#include "systemconfiguration/differential/input_case.h"
 
 namespace differential {
 

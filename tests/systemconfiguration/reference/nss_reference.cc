@@ -1,4 +1,4 @@
-#include "reference/nss_reference.h"
+#include "systemconfiguration/reference/nss_reference.h"
 
 #include <sstream>
 #include <vector>

@@ -1,4 +1,4 @@
-#include "reference/pam_reference.h"
+#include "systemconfiguration/reference/pam_reference.h"
 
 #include <cctype>
 #include <sstream>
