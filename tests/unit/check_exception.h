@@ -27,7 +27,8 @@ void CheckException(const Class& exception, unsigned long code, const std::strin
   const Exception& base = exception;
   const std::unique_ptr<const Exception> clone(base.Clone());
   ASSERT_NE(clone, nullptr);
-  EXPECT_TRUE(typeid(*clone) == typeid(Class)) << typeid(*clone).name();
+  const Exception& cloned = *clone;
+  EXPECT_TRUE(typeid(cloned) == typeid(Class)) << typeid(cloned).name();
   EXPECT_EQ(clone->Code(), code);
   EXPECT_EQ(clone->what(), text);
 

@@ -118,7 +118,8 @@ TEST_P(MappedExceptionRowTest, HasItsClassCodeAndText) {
     EXPECT_EQ(exception.Code(), row.code);
     EXPECT_EQ(exception.what(), text);
     const std::unique_ptr<const Exception> clone(exception.Clone());
-    EXPECT_TRUE(typeid(*clone) == row.type) << typeid(*clone).name();
+    const Exception& cloned = *clone;
+    EXPECT_TRUE(typeid(cloned) == row.type) << typeid(cloned).name();
     EXPECT_EQ(clone->Code(), row.code);
     EXPECT_EQ(clone->what(), text);
     try {

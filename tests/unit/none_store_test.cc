@@ -92,7 +92,8 @@ TEST_F(NoneStoreTest, IsCalledNone) {
 TEST_F(NoneStoreTest, GivesANewConfigurationOfItsKindOnEachCall) {
   const auto first = store_.GetStoreConfiguration();
   const auto second = store_.GetStoreConfiguration();
-  EXPECT_TRUE(typeid(*first) == typeid(NoRemoteAuthenticationStoreConfiguration));
+  const StoreConfiguration& configuration = *first;
+  EXPECT_TRUE(typeid(configuration) == typeid(NoRemoteAuthenticationStoreConfiguration));
   EXPECT_NE(first, second);
 }
 

@@ -98,7 +98,8 @@ TEST_F(StatusQueryTest, TheConfigurationIsANewObjectOnEachCall) {
   const auto first = store_.GetStoreConfiguration();
   const auto second = store_.GetStoreConfiguration();
   EXPECT_NE(first, second);
-  EXPECT_TRUE(typeid(*first) == typeid(ActiveDirectoryStoreConfiguration));
+  const StoreConfiguration& configuration = *first;
+  EXPECT_TRUE(typeid(configuration) == typeid(ActiveDirectoryStoreConfiguration));
   EXPECT_EQ(dynamic_cast<ActiveDirectoryStoreConfiguration&>(*first).machineAccountDN, "CN=HOST");
 }
 
