@@ -2,7 +2,11 @@
 
 #include <unistd.h>
 
+#include <chrono>
+#include <condition_variable>
+#include <cstddef>
 #include <mutex>
+#include <new>
 
 #include "common/attempt_log.h"
 #include "common/paths.h"
@@ -17,7 +21,47 @@ constexpr std::chrono::seconds kRecoveryTime{60};
 // Long enough for a keytab that is being made anew, which nobody asked for, to be finished.
 constexpr std::chrono::seconds kPatience{3};
 
-std::timed_mutex oneOperation;
+// Lets one operation at a time pass. Not a timed mutex, whose waiting ThreadSanitizer does not see.
+class Turnstile {
+ public:
+  bool Enter(std::chrono::milliseconds patience) {
+    std::unique_lock<std::mutex> lock(mutex_);
+    if (!freed_.wait_for(lock, patience, [this] { return !taken_; })) return false;
+    taken_ = true;
+    return true;
+  }
+
+  void Leave() {
+    const std::lock_guard<std::mutex> lock(mutex_);
+    taken_ = false;
+    freed_.notify_one();
+  }
+
+ private:
+  std::mutex mutex_;
+  std::condition_variable freed_;
+  bool taken_ = false;
+};
+
+// Never destroyed, so that a process may end while a thread waits; it holds nothing that would be leaked.
+Turnstile& TheTurnstile() {
+  alignas(Turnstile) static std::byte memory[sizeof(Turnstile)];
+  static Turnstile* const turnstile = new (memory) Turnstile;
+  return *turnstile;
+}
+
+// Throws Failure (kBusy) when another operation does not end in time.
+class Turn {
+ public:
+  Turn() {
+    if (!TheTurnstile().Enter(kPatience)) {
+      throw Failure(kBusy, "this process has another join, leave or change running");
+    }
+  }
+  Turn(const Turn&) = delete;
+  Turn& operator=(const Turn&) = delete;
+  ~Turn() { TheTurnstile().Leave(); }
+};
 
 Answer AskHelper(const Request& request, std::chrono::milliseconds limit) {
   return Ask(paths::kHelper, ChildGroup::kOwn, ChildEnvironment::kMinimal, request, limit);
@@ -33,8 +77,7 @@ void Recover(Request& request, const AttemptLog& log) {
 
 // Returns the helper's answer; throws when there is none.
 Answer AskAlone(Request& request, const AttemptLog& log) {
-  const std::unique_lock<std::timed_mutex> lock(oneOperation, kPatience);
-  if (!lock.owns_lock()) throw Failure(kBusy, "this process has another join, leave or change running");
+  const Turn turn;
   const std::chrono::seconds limit = LoadSettings().operationTimeout;
   Answer answer = AskHelper(request, limit);
   if (answer.end == Conversation::End::kAnswered) return answer;
