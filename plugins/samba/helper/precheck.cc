@@ -74,9 +74,11 @@ std::string FindAccountDn(const LogonRequest& request) {
   return answer.fields.value("accountDn", "");
 }
 
-void RemoveAccount(const LogonRequest& request) {
-  RequireSuccess(AskPrecheck("remove", request,
-                             {{"computerDnsName", HostDnsName(request.computer, request.dnsDomain)}}));
+std::string RemoveAccount(const LogonRequest& request) {
+  const Answer answer =
+      AskPrecheck("remove", request, {{"computerDnsName", HostDnsName(request.computer, request.dnsDomain)}});
+  RequireSuccess(answer);
+  return answer.fields["text"].get<std::string>();
 }
 
 }  // namespace sambaprovider

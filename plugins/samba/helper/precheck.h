@@ -36,8 +36,8 @@ Inspection Inspect(const AttemptLog& log, const LogonRequest& request, const std
 // The DN of this host's computer account; empty when there is none. Throws Failure.
 std::string FindAccountDn(const LogonRequest& request);
 
-// Removes this host's computer account. Throws Failure.
-void RemoveAccount(const LogonRequest& request);
+// Removes this host's computer account when there is one. Returns what it did. Throws Failure.
+std::string RemoveAccount(const LogonRequest& request);
 
 }  // namespace sambaprovider
 

@@ -17,16 +17,25 @@ namespace {
 
 constexpr const char* kStep = "undo";
 
-// Runs one part; whether it worked.
+// Runs one part, which says what it did; whether it worked.
 template <typename Part>
-bool Try(const AttemptLog& log, const std::string& done, const Part& part) {
+bool Try(const AttemptLog& log, const Part& part) {
   try {
-    part();
-    log.Note(kStep, done);
+    log.Note(kStep, part());
     return true;
   } catch (const Failure& failure) {
-    log.Note(kStep, std::string("not ") + done + ": " + failure.what());
+    log.Note(kStep, failure.what());
     return false;
+  }
+}
+
+std::string RemoveSecrets() {
+  try {
+    netapi::UnjoinLocally();
+    return "the machine's secrets are removed";
+  } catch (const Failure& failure) {
+    if (failure.Code() != kNotJoined) throw;
+    return "the host had no machine secrets yet";
   }
 }
 
@@ -44,17 +53,22 @@ void RestoreService() {
 
 void UndoJoin(const AttemptLog& log, const Journal& journal, const UndoAccount* account) {
   log.Begin(kStep, "taking the join of " + journal.dnsDomain + " back");
-  // libnetapi finds the secrets by the domain in smb.conf, so this comes before smb.conf is given back. There
-  // may be no secrets yet, which it reports as an error.
-  if (SmbConfIsOurs()) Try(log, "removed the machine's secrets", [] { netapi::UnjoinLocally(); });
+  // libnetapi finds the secrets by the domain in smb.conf, so this comes before smb.conf is given back.
+  if (SmbConfIsOurs()) Try(log, RemoveSecrets);
   if (journal.accountIsNew && account != nullptr) {
-    Try(log, "removed the computer account", [&] {
-      RemoveAccount({journal.dnsDomain, LocateControllers(journal.dnsDomain), account->user,
-                     account->password, journal.computer});
+    Try(log, [&] {
+      return RemoveAccount({journal.dnsDomain, LocateControllers(journal.dnsDomain), account->user,
+                            account->password, journal.computer});
     });
   }
-  const bool restored = Try(log, "gave smb.conf and the keytab back", [] { before_join::GiveBack(); });
-  Try(log, "put winbindd back as it was", RestoreService);
+  const bool restored = Try(log, [] {
+    before_join::GiveBack();
+    return "smb.conf and the keytab are as before";
+  });
+  Try(log, [] {
+    RestoreService();
+    return before_join::ServiceWasRunning() ? "winbindd runs as before" : "winbindd is stopped as before";
+  });
   if (restored) {
     RemoveJournal();
     before_join::DropCopies();
