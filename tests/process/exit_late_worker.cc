@@ -27,8 +27,8 @@ int main() {
   std::atexit(&LetTheCallReturn);
   testsupport::InstallPlugin("hangs");
   testsupport::ConfigureProvider("hangs");
-  auto* library = new testsupport::LoadedLibrary;
-  library->CreateActiveDirectoryStore(0)->GetStoreConfiguration();
+  static auto& library = *new testsupport::LoadedLibrary;  // Never unloaded.
+  library.CreateActiveDirectoryStore(0)->GetStoreConfiguration();
   const auto awaitCall = reinterpret_cast<void (*)()>(dlsym(RTLD_DEFAULT, "hangsAwaitCall"));
   if (awaitCall == nullptr) {
     std::fprintf(stderr, "the plug-in is not loaded\n");

@@ -7,6 +7,7 @@
 #include <stdexcept>
 #include <thread>
 
+#include "authentication/active_directory_store.h"
 #include "support/files.h"
 
 namespace testsupport {
@@ -28,9 +29,6 @@ std::size_t CountIdleThreads() {
 }
 
 const std::size_t IDLE_THREADS = CountIdleThreads();
-
-/// Room for an object of a class whose constructor is called by its address; larger than it needs.
-constexpr std::size_t STORE_ROOM = 256;
 
 }  // namespace
 
@@ -81,7 +79,7 @@ std::unique_ptr<AuthenticationStore> LoadedLibrary::CreateStore(const std::strin
 
 std::unique_ptr<AuthenticationStore> LoadedLibrary::CreateActiveDirectoryStore(int timeoutSeconds) const {
   using Constructor = void (*)(void*, int);
-  void* room = ::operator new(STORE_ROOM);
+  void* room = ::operator new(sizeof(quenix::authentication::ActiveDirectoryStore));
   reinterpret_cast<Constructor>(Find("_ZN6quenix14authentication20ActiveDirectoryStoreC1Ei"))(room,
                                                                                               timeoutSeconds);
   return std::unique_ptr<AuthenticationStore>(static_cast<AuthenticationStore*>(room));
