@@ -13,6 +13,9 @@
 namespace SystemConfiguration {
 namespace {
 
+// Saves the allocations by which a text grows.
+constexpr std::size_t ordinaryLineLength = 128;
+
 constexpr std::string_view trimmedCharacters = " \t\r\n";
 
 // Takes apart one line, which has no leading white space.
@@ -107,6 +110,7 @@ std::deque<NSSService>& NSSConfiguration::operator[](NSSDatabase database) {
 
 std::ostream& operator<<(std::ostream& stream, const NSSConfiguration& configuration) {
   std::string rest;
+  rest.reserve(ordinaryLineLength);
   for (const auto& [database, services] : configuration.databases_) {
     WriteLine(stream, static_cast<std::string>(database), services, rest);
   }

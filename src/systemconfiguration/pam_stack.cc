@@ -8,6 +8,9 @@
 namespace SystemConfiguration {
 namespace {
 
+// Saves the allocations by which a text grows.
+constexpr std::size_t ordinaryLineLength = 128;
+
 // The same as writing facility, entry and line end one after the other, at a fraction of the cost. Only the
 // first word goes through the stream by itself: the stream's width is meant for it.
 void WriteLine(std::ostream& stream, const std::string& facility, const PAMEntry& entry, std::string& rest) {
@@ -47,6 +50,7 @@ std::ostream& operator<<(std::ostream& stream, const PAMStack& stack) {
   if (stack.empty()) return stream;
   const std::string facility = stack.Facility();
   std::string rest;
+  rest.reserve(ordinaryLineLength);
   for (const PAMEntry& entry : stack) WriteLine(stream, facility, entry, rest);
   return stream;
 }
