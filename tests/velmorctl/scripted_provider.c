@@ -135,6 +135,24 @@ static uint32_t joinDomain(const char* domain, const char* organizationalUnit,
   return status;
 }
 
+/* A secret is named by its length. */
+static uint32_t joinDomainWithMachineAccount(const ActiveDirectoryDomainInfo* domain,
+                                             const ActiveDirectoryMachineAccountInfo* account) {
+  char call[512];
+  snprintf(call, sizeof(call), "joinDomainWithMachineAccount %s %s %s %s (%zu characters)",
+           domain->dnsDomainName, domain->netbiosDomainName, account->hostName, account->accountName,
+           strlen(account->joinBlob));
+  uint32_t status = play("joinDomainWithMachineAccount", call);
+  if (status == 0) {
+    char line[512];
+    snprintf(line, sizeof(line), "%s %s", domain->dnsDomainName, domain->netbiosDomainName);
+    writeLines("domain", (const char* const[]){line, NULL});
+  } else {
+    recordAttempt("end", status, "the host is in the way");
+  }
+  return status;
+}
+
 static uint32_t partDomain(const Credentials* credentials) {
   char call[512];
   snprintf(call, sizeof(call), "partDomain %s", credentials == NULL ? "-" : credentials->username);
@@ -259,6 +277,7 @@ const struct ActiveDirectoryClientOperations ActiveDirectoryClientOperations = {
     .getTrustedDomains = getTrustedDomains,
     .getMachineAccountDN = getMachineAccountDN,
     .getAnyDomainController = getAnyDomainController,
+    .joinDomainWithMachineAccount = joinDomainWithMachineAccount,
     .getDomainTrustRelationship = getDomainTrustRelationship,
     .setSmartCardEnabledServices = setSmartCardEnabledServices,
     .getSmartCardEnabledServices = getSmartCardEnabledServices,
