@@ -1,5 +1,6 @@
 """What the tests of velmor-camd share: the service with settings of its own, a helper that stands for the
 directory, and clients that behave well or badly."""
+import base64
 import concurrent.futures
 import http.client
 import json
@@ -251,6 +252,11 @@ class Service:
                 except OSError:
                     continue
         return False
+
+
+def blob_of(computer):
+    """The text for the join that the scripted helper gives."""
+    return base64.b64encode(f"the machine password of {computer} ".encode() * 60).decode()
 
 
 def wait_until(condition, limit=20):

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <vector>
 
 namespace camd {
 namespace {
@@ -28,16 +29,17 @@ unsigned int RateLimit::Count(const Address& client, unsigned int requestsPerMin
   return static_cast<unsigned int>(std::ceil((1 - allowance.requests) / perSecond));
 }
 
-// Whoever has not asked for a minute has its whole allowance again. When that is nobody, those who asked
-// longest ago lose their record.
+// Whoever has not asked for a minute has its whole allowance again. When too few are such, the half that
+// asked longest ago loses its record: a half, so that this seldom happens.
 void RateLimit::ForgetSome(Clock::time_point now) {
   std::erase_if(allowances_,
                 [now](const auto& entry) { return now - entry.second.at > std::chrono::minutes(1); });
   if (allowances_.size() < kMostClients) return;
-  const auto oldest =
-      std::min_element(allowances_.begin(), allowances_.end(),
-                       [](const auto& left, const auto& right) { return left.second.at < right.second.at; });
-  allowances_.erase(oldest);
+  std::vector<Clock::time_point> times;
+  for (const auto& [client, allowance] : allowances_) times.push_back(allowance.at);
+  const auto middle = times.begin() + static_cast<std::ptrdiff_t>(times.size() / 2);
+  std::nth_element(times.begin(), middle, times.end());
+  std::erase_if(allowances_, [limit = *middle](const auto& entry) { return entry.second.at <= limit; });
 }
 
 }  // namespace camd
