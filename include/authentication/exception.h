@@ -52,7 +52,7 @@ class VELMOR_EXPORT Exception : public std::exception {
   Class(const Class& other);               \
   Class& operator=(const Class&) = delete; \
   ~Class() override;                       \
-  Class* Clone() const override;           \
+  Exception* Clone() const override;       \
   [[noreturn]] void Throw() const override;
 
 #endif  // AUTHENTICATION_EXCEPTION_H

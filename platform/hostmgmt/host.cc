@@ -56,7 +56,6 @@ void SetOption(const std::string& path, const OptionValue& value) {
 }  // namespace
 
 Host::Host() = default;
-Host::~Host() = default;
 
 std::shared_ptr<const Adv::AdvancedOptionBranch> Host::GetAdvancedOptions() const {
   const auto root = std::make_shared<Adv::AdvancedOptionBranch>();

@@ -48,6 +48,7 @@ std::vector<std::string> DefaultRouteInterfaces() {
   std::stable_sort(routes.begin(), routes.end(),
                    [](const Route& left, const Route& right) { return left.metric < right.metric; });
   std::vector<std::string> names;
+  names.reserve(routes.size());
   for (const Route& route : routes) names.push_back(route.interface);
   return names;
 }

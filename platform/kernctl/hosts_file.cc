@@ -50,7 +50,6 @@ void RequireEntry(const HostsEntry& entry) {
 HostsFile::HostsFile() {
   ReadLines();
 }
-HostsFile::~HostsFile() = default;
 
 void HostsFile::AddOrReplaceEntry(const std::string& address, const std::string& canonicalName,
                                   const std::vector<std::string>& aliases) {

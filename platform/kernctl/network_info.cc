@@ -80,7 +80,6 @@ NetworkInterface::~NetworkInterface() = default;
 NetworkInfoImpl::NetworkInfoImpl() {
   ReadInterfaces();
 }
-NetworkInfoImpl::~NetworkInfoImpl() = default;
 
 std::unique_ptr<NetworkInterface> NetworkInfoImpl::GetManagementInterface() {
   const std::vector<InterfaceState> interfaces = ReadInterfaces();

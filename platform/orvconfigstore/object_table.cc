@@ -26,7 +26,7 @@ std::shared_ptr<ConfigStoreObject> ObjectTable::Find(const ConfigStoreObjectId& 
   Statement query = PrepareFor(
       "SELECT id, checksum FROM object WHERE namespace = ? AND component = ? AND grp = ? AND key = ?", id);
   if (!query.Step()) return nullptr;
-  const auto object = std::make_shared<ConfigStoreObject>(id);
+  auto object = std::make_shared<ConfigStoreObject>(id);
   Statement fields = database_.Prepare("SELECT name, value FROM field WHERE object = ?");
   fields.BindInteger(query.GetInteger(0));
   while (fields.Step()) object->SetValue(fields.GetText(0).c_str(), fields.GetBytes(1));

@@ -54,6 +54,7 @@ class SpawnSettings {
 
 pid_t Start(std::vector<std::string> arguments) {
   std::vector<char*> pointers;
+  pointers.reserve(arguments.size() + 1);
   for (std::string& argument : arguments) pointers.push_back(argument.data());
   pointers.push_back(nullptr);
   std::string path = "PATH=/usr/sbin:/usr/bin:/sbin:/bin";

@@ -5,7 +5,7 @@
 #define VELMOR_DEFINE_EXCEPTION_OPERATIONS(Class) \
   Class::Class(const Class&) = default;           \
   Class::~Class() = default;                      \
-  Class* Class::Clone() const {                   \
+  Exception* Class::Clone() const {               \
     return new Class(*this);                      \
   }                                               \
   void Class::Throw() const {                     \

@@ -11,8 +11,7 @@ void ThrowMappedException(unsigned int code) {
     throw Class();
 
   switch (code) {
-    case 0:
-      throw FileNotFoundException();
+    case 0:  // shares the first row, that of 2
       VELMOR_PROVIDER_EXCEPTION_ROWS(VELMOR_THROW_ROW)
     case 0xFFFF0000:
     case 0xFFFF0001:

@@ -29,19 +29,20 @@ void RunKeepingFailure(Work work, std::unique_ptr<Exception>& failure) {
   }
 }
 
-/// Runs `work` and passes its outcome to `finish`, whatever it is. In a catch block and not in a destructor:
-/// an exception that nobody catches ends the process without destroying anything.
-template <class Work, class Finish>
-void RunAndFinish(Work work, Finish finish) {
+/// Runs `work` and passes its outcome to `finish` for the request of `key`, whatever it is. In a catch block
+/// and not in a destructor: an exception that nobody catches ends the process without destroying anything.
+template <class Work>
+void RunAndFinish(const std::string& key, Work work,
+                  void (*finish)(const std::string& key, std::unique_ptr<Exception>&& failure)) {
   std::unique_ptr<Exception> failure =
       std::make_unique<ThreadErrorException>("Unexpected thread termination");
   try {
     RunKeepingFailure(work, failure);
   } catch (...) {
-    finish(std::move(failure));
+    finish(key, std::move(failure));
     throw;
   }
-  finish(std::move(failure));
+  finish(key, std::move(failure));
 }
 
 /// `ask()`, or `neutral` when the plug-in lacks the operation.
@@ -99,7 +100,7 @@ void ActiveDirectoryStore::GetStoreConfigurationInt(Provider provider, const std
     RunIgnoringFailure([&] { configuration.machineAccountDN = provider->GetMachineAccountDN(); });
     _adCache.SetConfiguration(std::move(configuration));
   };
-  RunAndFinish(ask, [&](auto&& failure) { FinishRequest(key, std::move(failure)); });
+  RunAndFinish(key, ask, &FinishRequest);
 }
 
 void ActiveDirectoryStore::GetTrustedDomainsInt(Provider provider, const std::string& key) {
@@ -107,7 +108,7 @@ void ActiveDirectoryStore::GetTrustedDomainsInt(Provider provider, const std::st
     _adCache.SetTrustedDomains(
         AskOrElse([&] { return provider->GetTrustedDomains(); }, std::deque<Domain>()));
   };
-  RunAndFinish(ask, [&](auto&& failure) { FinishRequest(key, std::move(failure)); });
+  RunAndFinish(key, ask, &FinishRequest);
 }
 
 void ActiveDirectoryStore::GetDomainTrustStateInt(Provider provider, const std::string& key) {
@@ -115,7 +116,7 @@ void ActiveDirectoryStore::GetDomainTrustStateInt(Provider provider, const std::
     _adCache.SetDomainTrustState(
         AskOrElse([&] { return provider->GetDomainTrustState(); }, TRUST_STATE_NOT_PROVIDED));
   };
-  RunAndFinish(ask, [&](auto&& failure) { FinishRequest(key, std::move(failure)); });
+  RunAndFinish(key, ask, &FinishRequest);
 }
 
 void ActiveDirectoryStore::GetDomainTrustRelationshipInt(Provider provider, const std::string& key,
@@ -125,7 +126,7 @@ void ActiveDirectoryStore::GetDomainTrustRelationshipInt(Provider provider, cons
         domain, AskOrElse([&] { return provider->GetDomainTrustRelationship(domain); },
                           TRUST_RELATIONSHIP_NOT_PROVIDED));
   };
-  RunAndFinish(ask, [&](auto&& failure) { FinishRequest(key, std::move(failure)); });
+  RunAndFinish(key, ask, &FinishRequest);
 }
 
 }  // namespace quenix::authentication

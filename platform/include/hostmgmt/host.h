@@ -19,7 +19,6 @@ namespace HostMgmt {
 class HOSTMGMT_EXPORT Host {
  public:
   Host();
-  ~Host();
   Host(const Host&) = delete;
   Host& operator=(const Host&) = delete;
 

@@ -15,7 +15,6 @@ class HOSTMGMT_EXPORT HostsFile {
   /// Reads the file, so that one that cannot be read is known before anything is changed; a missing file
   /// counts as an empty one. Throws HostMgmt::Lib::HostMgmtException when it cannot be read.
   HostsFile();
-  ~HostsFile();
   HostsFile(const HostsFile&) = delete;
   HostsFile& operator=(const HostsFile&) = delete;
 

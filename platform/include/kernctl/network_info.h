@@ -33,7 +33,6 @@ class HOSTMGMT_EXPORT NetworkInfoImpl {
  public:
   /// Throws HostMgmt::Lib::HostMgmtException when the system does not give its interfaces.
   NetworkInfoImpl();
-  ~NetworkInfoImpl();
   NetworkInfoImpl(const NetworkInfoImpl&) = delete;
   NetworkInfoImpl& operator=(const NetworkInfoImpl&) = delete;
 
