@@ -5,7 +5,7 @@
 
 #include "common/status.h"
 
-// Expects that the statement throws a Failure with this status.
+/// Expects that the statement throws a Failure with this status.
 #define EXPECT_FAILURE(statement, status)                                       \
   try {                                                                         \
     statement;                                                                  \

@@ -1,4 +1,4 @@
-// The shipped plug-in, loaded as the library does.
+/// The shipped plug-in, loaded as the library does.
 #ifndef SAMBA_LOADED_PLUGIN_H
 #define SAMBA_LOADED_PLUGIN_H
 
@@ -8,7 +8,7 @@
 
 namespace sambatest {
 
-// Loads the plug-in; unloads it at its end.
+/// Loads the plug-in; unloads it at its end.
 class LoadedPlugin {
  public:
   LoadedPlugin();
@@ -24,10 +24,10 @@ class LoadedPlugin {
   void* handle_;
 };
 
-// Puts a shell script in the helper's place.
+/// Puts a shell script in the helper's place.
 void InstallHelper(const std::string& lines);
 
-// Puts a state file in its place that says that the host is a member of CORP.
+/// Puts a state file in its place that says that the host is a member of CORP.
 void InstallJoinedState();
 
 }  // namespace sambatest

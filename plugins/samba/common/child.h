@@ -1,8 +1,8 @@
-// Child processes of the plug-in and of its helper: started without a shell, with nothing of ours open in
-// them, and ended at a deadline.
-//
-// Safe in a foreign process with threads: no signal handler, no change of the environment, no SIGPIPE, and no
-// reliance on being the one who collects the child.
+/// Child processes of the plug-in and of its helper: started without a shell, with nothing of ours open in
+/// them, and ended at a deadline.
+///
+/// Safe in a foreign process with threads: no signal handler, no change of the environment, no SIGPIPE, and
+/// no reliance on being the one who collects the child.
 #ifndef SAMBA_COMMON_CHILD_H
 #define SAMBA_COMMON_CHILD_H
 
@@ -13,10 +13,10 @@
 
 namespace sambaprovider {
 
-// Whether a child leads a session of its own, so that it can be ended with all its children.
+/// Whether a child leads a session of its own, so that it can be ended with all its children.
 enum class ChildGroup { kOwn, kCallers };
 
-// Which environment a child gets.
+/// Which environment a child gets.
 enum class ChildEnvironment { kMinimal, kCallers };
 
 struct Conversation {
@@ -29,9 +29,9 @@ struct Conversation {
   std::string answer;
 };
 
-// Starts the program `path` with one socket as its standard input and output, sends it one line and `secret`,
-// and waits for one line. Has collected the child when it returns. Takes at most `limit` and a few seconds.
-// Throws Failure (kInternalError) when the program cannot be started.
+/// Starts the program `path` with one socket as its standard input and output, sends it one line and
+/// `secret`, and waits for one line. Has collected the child when it returns. Takes at most `limit` and a few
+/// seconds. Throws Failure (kInternalError) when the program cannot be started.
 Conversation Converse(const std::string& path, ChildGroup group, ChildEnvironment environment,
                       const std::string& line, std::string_view secret, std::chrono::milliseconds limit);
 
@@ -41,14 +41,14 @@ struct ProgramResult {
   std::string output;   // standard output and errors; when it is very long, its end
 };
 
-// The last line that is not blank.
+/// The last line that is not blank.
 std::string LastLine(const std::string& text);
 
-// Whether a program's output is wanted; a program that leaves a daemon behind must have none.
+/// Whether a program's output is wanted; a program that leaves a daemon behind must have none.
 enum class ProgramOutput { kWanted, kDropped };
 
-// Runs a program of the system to its end, in the caller's process group and environment, with no input.
-// Throws Failure (kInternalError) when it cannot be started.
+/// Runs a program of the system to its end, in the caller's process group and environment, with no input.
+/// Throws Failure (kInternalError) when it cannot be started.
 ProgramResult RunProgram(const std::vector<std::string>& command, ProgramOutput output,
                          std::chrono::milliseconds limit);
 

@@ -1,4 +1,4 @@
-// The fixed places of the provider's files.
+/// The fixed places of the provider's files.
 #ifndef SAMBA_COMMON_PATHS_H
 #define SAMBA_COMMON_PATHS_H
 
@@ -15,9 +15,9 @@ inline constexpr const char* kAttempts = "/var/lib/quenix/samba/attempts.log";
 inline constexpr const char* kLock = "/var/lib/quenix/samba/lock";
 inline constexpr const char* kJournal = "/var/lib/quenix/samba/journal.json";
 
-// What the host had before the join, kept until it leaves.
+/// What the host had before the join, kept until it leaves.
 inline constexpr const char* kBeforeFolder = "/var/lib/quenix/samba/before";
-// Byte for byte what this provider wrote to smb.conf last; tells our file from one that somebody changed.
+/// Byte for byte what this provider wrote to smb.conf last; tells our file from one that somebody changed.
 inline constexpr const char* kWrittenSmbConf = "/var/lib/quenix/samba/smb.conf.written";
 
 inline constexpr const char* kSmbConf = "/etc/samba/smb.conf";

@@ -1,4 +1,4 @@
-// A piece of memory for a secret.
+/// A piece of memory for a secret.
 #ifndef SAMBA_COMMON_SECRET_H
 #define SAMBA_COMMON_SECRET_H
 
@@ -7,13 +7,13 @@
 
 namespace sambaprovider {
 
-// Owns a copy of a secret, followed by a zero byte, and wipes it before the memory is given back. It never
-// grows, so that no unwiped copy is left behind. Movable, not copyable.
+/// Owns a copy of a secret, followed by a zero byte, and wipes it before the memory is given back. It never
+/// grows, so that no unwiped copy is left behind. Movable, not copyable.
 class Secret {
  public:
   Secret() = default;
   explicit Secret(std::string_view text);
-  // Room for `size` bytes, all zero, to be filled through Data().
+  /// Room for `size` bytes, all zero, to be filled through Data().
   explicit Secret(size_t size);
   Secret(Secret&& other) noexcept;
   Secret& operator=(Secret&& other) noexcept;

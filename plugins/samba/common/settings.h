@@ -1,4 +1,4 @@
-// The provider's own settings file.
+/// The provider's own settings file.
 #ifndef SAMBA_COMMON_SETTINGS_H
 #define SAMBA_COMMON_SETTINGS_H
 
@@ -9,20 +9,20 @@
 namespace sambaprovider {
 
 struct Settings {
-  // Take over a computer account of this host's name although it belongs to another host.
+  /// Take over a computer account of this host's name although it belongs to another host.
   bool reuseAccount = false;
-  // When winbindd gives a question up.
+  /// When winbindd gives a question up.
   std::chrono::seconds winbindRequestTimeout{15};
-  // When a join, a leave or a change of preferred controllers is ended from outside.
+  /// When a join, a leave or a change of preferred controllers is ended from outside.
   std::chrono::seconds operationTimeout{120};
 };
 
-// Reads lines `key = "value"`, quotes optional, blank lines allowed. Throws Failure
-// (kHostConfigurationInTheWay) with the line's number for a line without "=", an unknown or repeated key, or
-// an impossible value.
+/// Reads lines `key = "value"`, quotes optional, blank lines allowed. Throws Failure
+/// (kHostConfigurationInTheWay) with the line's number for a line without "=", an unknown or repeated key, or
+/// an impossible value.
 Settings ParseSettings(std::string_view text);
 
-// Parses the settings file; the defaults when there is none.
+/// Parses the settings file; the defaults when there is none.
 Settings LoadSettings();
 
 }  // namespace sambaprovider

@@ -1,4 +1,4 @@
-// Samba's configuration file: what we write, and whose the present one is.
+/// Samba's configuration file: what we write, and whose the present one is.
 #ifndef SAMBA_COMMON_SMB_CONF_H
 #define SAMBA_COMMON_SMB_CONF_H
 
@@ -12,24 +12,24 @@
 
 namespace sambaprovider {
 
-// During the join libnetapi writes the secrets; it crashes there when it is told to keep a keytab too.
+/// During the join libnetapi writes the secrets; it crashes there when it is told to keep a keytab too.
 enum class KeytabUse { kDuringJoin, kKept };
 
-// The text of smb.conf for a member of the state's domain.
+/// The text of smb.conf for a member of the state's domain.
 std::string FormatSmbConf(const State& state, const Settings& settings, KeytabUse keytab);
 
 enum class SmbConfOwner { kNobody, kProvider, kDistribution, kAdministrator };
 
-// Decides whose a present smb.conf is from its text, the text that we wrote last and the distribution's file.
-// The workgroup line may differ from the distribution's, since its installation asks for it.
+/// Decides whose a present smb.conf is from its text, the text that we wrote last and the distribution's
+/// file. The workgroup line may differ from the distribution's, since its installation asks for it.
 SmbConfOwner OwnerOfSmbConf(const std::optional<std::string>& present,
                             const std::optional<std::string>& written,
                             const std::optional<std::string>& distribution);
 
-// Reads the three files. Throws Failure (kHostConfigurationInTheWay) when smb.conf is an administrator's.
+/// Reads the three files. Throws Failure (kHostConfigurationInTheWay) when smb.conf is an administrator's.
 void RequireSmbConfIsReplaceable();
 
-// Writes smb.conf, and first remembers the text as ours. Throws Failure (kInternalError).
+/// Writes smb.conf, and first remembers the text as ours. Throws Failure (kInternalError).
 void WriteSmbConf(const std::string& text);
 
 }  // namespace sambaprovider

@@ -1,4 +1,4 @@
-// The status codes that this provider gives out, and the exception that carries one inside it.
+/// The status codes that this provider gives out, and the exception that carries one inside it.
 #ifndef SAMBA_COMMON_STATUS_H
 #define SAMBA_COMMON_STATUS_H
 
@@ -8,7 +8,7 @@
 
 namespace sambaprovider {
 
-// Codes of the Windows system and network-management errors; docs/samba-provider.md says when each is given.
+/// Codes of the Windows system and network-management errors; docs/samba-provider.md says when each is given.
 enum Status : uint32_t {
   kSuccess = 0,
   kAccessDenied = 5,
@@ -40,7 +40,7 @@ enum Status : uint32_t {
   kTimedOut = 10060,
 };
 
-// A step that did not work. `what()` is one line for the record of attempts and never holds a secret.
+/// A step that did not work. `what()` is one line for the record of attempts and never holds a secret.
 class Failure : public std::runtime_error {
  public:
   Failure(uint32_t status, const std::string& text) : std::runtime_error(text), status_(status) {}
@@ -51,7 +51,7 @@ class Failure : public std::runtime_error {
   uint32_t status_;
 };
 
-// What an operation came to.
+/// What an operation came to.
 struct Outcome {
   uint32_t status = kSuccess;
   std::string text;

@@ -1,4 +1,4 @@
-// A file descriptor that is closed by its owner's end.
+/// A file descriptor that is closed by its owner's end.
 #ifndef SAMBA_COMMON_UNIQUE_FD_H
 #define SAMBA_COMMON_UNIQUE_FD_H
 

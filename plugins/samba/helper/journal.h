@@ -1,4 +1,4 @@
-// What is under way, so that the next run can put a killed one right. There only while something changes.
+/// What is under way, so that the next run can put a killed one right. There only while something changes.
 #ifndef SAMBA_HELPER_JOURNAL_H
 #define SAMBA_HELPER_JOURNAL_H
 
@@ -13,15 +13,15 @@ struct Journal {
   std::string dnsDomain;
   std::string netbiosDomain;
   std::string computer;
-  // Whether a join may have made the account, so that undoing it removes the account again.
+  /// Whether a join may have made the account, so that undoing it removes the account again.
   bool accountIsNew = false;
 };
 
-// Nothing when no operation was interrupted; also for a journal that cannot be understood, which can only be
-// one that was never written whole. Throws Failure (kInternalError) when it cannot be read.
+/// Nothing when no operation was interrupted; also for a journal that cannot be understood, which can only be
+/// one that was never written whole. Throws Failure (kInternalError) when it cannot be read.
 std::optional<Journal> LoadJournal();
 
-// Written durably before the first change and removed after the last one. Throw Failure (kInternalError).
+/// Written durably before the first change and removed after the last one. Throw Failure (kInternalError).
 void SaveJournal(const Journal& journal);
 void RemoveJournal();
 

@@ -1,4 +1,4 @@
-// The calls of libnetapi that work for a member: made offline in two halves, and undone.
+/// The calls of libnetapi that work for a member: made offline in two halves, and undone.
 #ifndef SAMBA_HELPER_NETAPI_H
 #define SAMBA_HELPER_NETAPI_H
 
@@ -8,22 +8,22 @@
 
 namespace sambaprovider::netapi {
 
-// libnetapi reads smb.conf at the first call and never again in this process. Every operation may block for
-// half a minute when the controller stops answering, and throws Failure with libnetapi's code and text.
+/// libnetapi reads smb.conf at the first call and never again in this process. Every operation may block for
+/// half a minute when the controller stops answering, and throws Failure with libnetapi's code and text.
 
-// Makes, or takes again, the computer account, and returns the text that the second half needs. The
-// organisational unit is a DN that exists, or empty.
+/// Makes, or takes again, the computer account, and returns the text that the second half needs. The
+/// organisational unit is a DN that exists, or empty.
 Secret ProvisionAccount(const std::string& dnsDomain, const std::string& computer,
                         const std::string& organizationalUnitDn, const std::string& controller,
                         const std::string& user, const Secret& password);
 
-// Writes the machine's secrets on this host; needs no network. smb.conf must be that of a member already.
+/// Writes the machine's secrets on this host; needs no network. smb.conf must be that of a member already.
 void StoreSecrets(const Secret& blob);
 
-// Disables the computer account and removes the machine's secrets from this host.
+/// Disables the computer account and removes the machine's secrets from this host.
 void Unjoin(const std::string& user, const Secret& password);
 
-// Removes the machine's secrets from this host; needs neither network nor account.
+/// Removes the machine's secrets from this host; needs neither network nor account.
 void UnjoinLocally();
 
 }  // namespace sambaprovider::netapi

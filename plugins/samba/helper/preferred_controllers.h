@@ -1,4 +1,4 @@
-// Making winbindd use the preferred domain controllers.
+/// Making winbindd use the preferred domain controllers.
 #ifndef SAMBA_HELPER_PREFERRED_CONTROLLERS_H
 #define SAMBA_HELPER_PREFERRED_CONTROLLERS_H
 
@@ -7,9 +7,9 @@
 
 namespace sambaprovider {
 
-// Writes smb.conf for the state, which must be joined, and has winbindd begin anew with it. winbindd
-// remembers the controller that it used last and ignores the setting unless its cache is emptied while it is
-// stopped. Throws Failure.
+/// Writes smb.conf for the state, which must be joined, and has winbindd begin anew with it. winbindd
+/// remembers the controller that it used last and ignores the setting unless its cache is emptied while it is
+/// stopped. Throws Failure.
 void ApplyPreferredControllers(const State& state, const Settings& settings);
 
 }  // namespace sambaprovider

@@ -1,4 +1,4 @@
-// Putting right what did not come to its end.
+/// Putting right what did not come to its end.
 #ifndef SAMBA_HELPER_UNDO_H
 #define SAMBA_HELPER_UNDO_H
 
@@ -10,18 +10,18 @@
 
 namespace sambaprovider {
 
-// The account that a join was started with, when it is at hand.
+/// The account that a join was started with, when it is at hand.
 struct UndoAccount {
   std::string user;
   const Secret& password;
 };
 
-// Takes a join back as far as it got: machine secrets, computer account when the join made it and `account`
-// is not null, smb.conf, keytab, winbindd. Goes on when a part fails and records it; the journal stays when
-// the host's own files could not be restored, so that the next run tries again.
+/// Takes a join back as far as it got: machine secrets, computer account when the join made it and `account`
+/// is not null, smb.conf, keytab, winbindd. Goes on when a part fails and records it; the journal stays when
+/// the host's own files could not be restored, so that the next run tries again.
 void UndoJoin(const AttemptLog& log, const Journal& journal, const UndoAccount* account);
 
-// The part of a leave after the machine's secrets are gone; may be done again. Throws Failure.
+/// The part of a leave after the machine's secrets are gone; may be done again. Throws Failure.
 void FinishLeave(const AttemptLog& log);
 
 }  // namespace sambaprovider

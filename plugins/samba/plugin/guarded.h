@@ -1,4 +1,4 @@
-// The border between the plug-in's exceptions and the status codes of its table.
+/// The border between the plug-in's exceptions and the status codes of its table.
 #ifndef SAMBA_PLUGIN_GUARDED_H
 #define SAMBA_PLUGIN_GUARDED_H
 
@@ -9,7 +9,7 @@
 
 namespace sambaprovider {
 
-// Runs `body` and gives its Failure's status, or kSuccess. Nothing else leaves it.
+/// Runs `body` and gives its Failure's status, or kSuccess. Nothing else leaves it.
 template <typename Body>
 uint32_t Guarded(const Body& body) noexcept {
   try {

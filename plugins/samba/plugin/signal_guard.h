@@ -1,4 +1,4 @@
-// Keeps SIGPIPE away from the host process while a library writes to a socket.
+/// Keeps SIGPIPE away from the host process while a library writes to a socket.
 #ifndef SAMBA_PLUGIN_SIGNAL_GUARD_H
 #define SAMBA_PLUGIN_SIGNAL_GUARD_H
 
@@ -6,8 +6,8 @@
 
 namespace sambaprovider {
 
-// Blocks SIGPIPE in the calling thread while it exists, and takes one away that came meanwhile. A signal that
-// was pending before is left alone. Changes no handler.
+/// Blocks SIGPIPE in the calling thread while it exists, and takes one away that came meanwhile. A signal
+/// that was pending before is left alone. Changes no handler.
 class SigpipeGuard {
  public:
   SigpipeGuard();

@@ -1,4 +1,4 @@
-// The operations of the plug-in's table; active_directory_client.h says what each one does.
+/// The operations of the plug-in's table; active_directory_client.h says what each one does.
 #ifndef SAMBA_PLUGIN_SLOTS_H
 #define SAMBA_PLUGIN_SLOTS_H
 
@@ -26,7 +26,7 @@ TrustState GetDomainTrustState(void);
 TrustRelationship GetDomainTrustRelationship(const char* domain);
 uint32_t GetTrustedDomains(ActiveDirectoryDomainPair*** domains, ActiveDirectoryFree* release);
 
-// The qualifier is the name of a site.
+/// The qualifier is the name of a site.
 uint32_t GetAnyDomainController(const char* qualifier, const char* domain, char** text,
                                 ActiveDirectoryFree* release);
 uint32_t ConvertCanonicalUsername(const char* name, char** text, ActiveDirectoryFree* release);

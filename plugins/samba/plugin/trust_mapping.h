@@ -1,4 +1,4 @@
-// What winbindd's answers mean in the terms of the plug-in interface.
+/// What winbindd's answers mean in the terms of the plug-in interface.
 #ifndef SAMBA_PLUGIN_TRUST_MAPPING_H
 #define SAMBA_PLUGIN_TRUST_MAPPING_H
 
@@ -9,11 +9,11 @@
 
 namespace sambaprovider {
 
-// `serviceRuns` tells winbindd that is down from one that has given a question up; it matters only for
-// WBC_ERR_WINBIND_NOT_AVAILABLE.
+/// `serviceRuns` tells winbindd that is down from one that has given a question up; it matters only for
+/// WBC_ERR_WINBIND_NOT_AVAILABLE.
 TrustState TrustStateOf(const winbind::TrustCheck& check, bool serviceRuns);
 
-// For a domain other than the joined one, from its WBC_DOMINFO_TRUST_ flags.
+/// For a domain other than the joined one, from its WBC_DOMINFO_TRUST_ flags.
 TrustRelationship RelationshipOf(uint32_t trustFlags);
 
 }  // namespace sambaprovider

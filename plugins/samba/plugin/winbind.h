@@ -1,5 +1,5 @@
-// Questions to winbindd. Each call uses a connection of its own, so threads need not know of each other. How
-// long one may block is winbindd's own request time-out.
+/// Questions to winbindd. Each call uses a connection of its own, so threads need not know of each other. How
+/// long one may block is winbindd's own request time-out.
 #ifndef SAMBA_PLUGIN_WINBIND_H
 #define SAMBA_PLUGIN_WINBIND_H
 
@@ -15,7 +15,7 @@ extern "C" {
 
 namespace sambaprovider::winbind {
 
-// Whether winbindd runs at all.
+/// Whether winbindd runs at all.
 bool Answers();
 
 struct TrustCheck {
@@ -23,7 +23,7 @@ struct TrustCheck {
   uint32_t ntStatus = 0;  // meaningful with WBC_ERR_AUTH_ERROR
 };
 
-// Has the domain accept the machine's password anew.
+/// Has the domain accept the machine's password anew.
 TrustCheck CheckTrust(const std::string& netbiosDomain);
 
 struct TrustedDomain {
@@ -32,15 +32,15 @@ struct TrustedDomain {
   uint32_t flags = 0;  // WBC_DOMINFO_TRUST_...
 };
 
-// All domains but the host's own set of accounts and BUILTIN; the joined domain is among them. Throws
-// Failure: kServiceNotActive when winbindd does not run, kNoLogonServers when it runs and has no answer.
+/// All domains but the host's own set of accounts and BUILTIN; the joined domain is among them. Throws
+/// Failure: kServiceNotActive when winbindd does not run, kNoLogonServers when it runs and has no answer.
 std::vector<TrustedDomain> ListDomains();
 
-// A controller's DNS name. `site` may be empty. Throws Failure: kNoSuchDomain, and as ListDomains.
+/// A controller's DNS name. `site` may be empty. Throws Failure: kNoSuchDomain, and as ListDomains.
 std::string FindController(const std::string& dnsDomain, const std::string& site);
 
-// The account's name as the directory writes it, "DOMAIN\name". Throws Failure: kNoSuchUser, and as
-// ListDomains.
+/// The account's name as the directory writes it, "DOMAIN\name". Throws Failure: kNoSuchUser, and as
+/// ListDomains.
 std::string CanonicalName(const AccountName& account);
 
 }  // namespace sambaprovider::winbind

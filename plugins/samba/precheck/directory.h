@@ -1,4 +1,4 @@
-// Questions to one domain controller through LDAP.
+/// Questions to one domain controller through LDAP.
 #ifndef SAMBA_PRECHECK_DIRECTORY_H
 #define SAMBA_PRECHECK_DIRECTORY_H
 
@@ -10,7 +10,7 @@
 
 namespace sambaprovider {
 
-// What a controller tells anybody.
+/// What a controller tells anybody.
 struct RootEntry {
   std::string controllerDnsName;
   std::string baseDn;
@@ -23,12 +23,12 @@ struct ComputerAccount {
   std::string dnsHostName;
 };
 
-// Parses LDAP's "20261121010203.0Z" to seconds since 1970. Throws Failure (kInternalError).
+/// Parses LDAP's "20261121010203.0Z" to seconds since 1970. Throws Failure (kInternalError).
 int64_t ParseGeneralizedTime(const std::string& text);
 
-// A connection to one controller. Every operation waits for at most the time-out of the constructor and
-// throws Failure with kNoLogonServers when the controller does not answer. Not for use by several threads at
-// once.
+/// A connection to one controller. Every operation waits for at most the time-out of the constructor and
+/// throws Failure with kNoLogonServers when the controller does not answer. Not for use by several threads at
+/// once.
 class Directory {
  public:
   Directory(const std::string& controller, std::chrono::seconds timeout);
@@ -36,17 +36,17 @@ class Directory {
   Directory& operator=(const Directory&) = delete;
   ~Directory();
 
-  // Needs no log-on.
+  /// Needs no log-on.
   RootEntry ReadRootEntry();
 
-  // Authenticates with the ticket that LogOn left and encrypts what follows.
+  /// Authenticates with the ticket that LogOn left and encrypts what follows.
   void Bind();
 
-  // The domain's NetBIOS name.
+  /// The domain's NetBIOS name.
   std::string NetbiosName(const RootEntry& root);
-  // The computer account with this short name.
+  /// The computer account with this short name.
   ComputerAccount FindComputer(const RootEntry& root, const std::string& computer);
-  // Whether an entry exists. Throws Failure (kInvalidOrganizationalUnit) when `dn` cannot be a name.
+  /// Whether an entry exists. Throws Failure (kInvalidOrganizationalUnit) when `dn` cannot be a name.
   bool Exists(const std::string& dn);
   void Delete(const std::string& dn);
 
