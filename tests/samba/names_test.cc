@@ -73,6 +73,10 @@ TEST(NamesTest, OneTrailingDotIsTakenAway) {
   EXPECT_EQ(WithoutTrailingDot("."), ".");
 }
 
+TEST(NamesTest, ADomainHasADistinguishedName) {
+  EXPECT_EQ(DomainDn("corp.example"), "DC=corp,DC=example");
+}
+
 TEST(NamesTest, TheHostsShortNameEndsAtTheFirstDot) {
   testsupport::SetHostName("host1.corp.example");
   EXPECT_EQ(HostShortName(), "host1");

@@ -105,6 +105,18 @@ std::string WithoutTrailingDot(std::string_view domain) {
   return std::string(domain);
 }
 
+std::string DomainDn(std::string_view dnsDomain) {
+  std::string dn = "DC=";
+  for (const char byte : dnsDomain) {
+    if (byte == '.') {
+      dn += ",DC=";
+    } else {
+      dn += byte;
+    }
+  }
+  return dn;
+}
+
 std::string HostShortName() {
   std::array<char, 256> buffer = {};
   if (gethostname(buffer.data(), buffer.size() - 1) != 0) {

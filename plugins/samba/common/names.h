@@ -38,6 +38,9 @@ AccountName SplitAccountName(std::string_view name);
 /// The domain without the one dot that may end it.
 std::string WithoutTrailingDot(std::string_view domain);
 
+/// The distinguished name of a DNS domain, "DC=corp,DC=example".
+std::string DomainDn(std::string_view dnsDomain);
+
 /// The host's name before its first dot. Throws Failure (kInvalidComputerName) when it cannot be read or is
 /// no computer name.
 std::string HostShortName();

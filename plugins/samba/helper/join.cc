@@ -51,15 +51,19 @@ void CheckAccount(const Inspection& found, const std::string& ownDnsName, const 
                                     " takes it over");
 }
 
-// The steps that change the host, common to both joins. Undone when it ends before Finish().
+// The steps that change the host, common to both joins. What fails after Prepare() has to be undone.
 class Membership {
  public:
   Membership(const Call& call, State state, Journal journal)
       : call_(call), state_(std::move(state)), journal_(std::move(journal)) {}
 
-  void Begin() {
+  // Changes nothing yet. A failure must not be undone: the copies may not be whole then.
+  void Prepare() {
     before_join::PutAside();
     SaveJournal(journal_);
+  }
+
+  void Configure() {
     call_.log.Run("configure", "writing smb.conf for " + state_.netbiosDomain, [&] {
       winbind_service::Stop();
       // Samba remembers for a while which controllers did not answer, also those that do now.
@@ -157,8 +161,9 @@ std::string Join(const Call& call) {
   const Journal journal{Journal::Operation::kJoin, domain, found.netbiosDomain, computer,
                         found.accountDn.empty()};
   Membership membership(call, MemberState(domain, found.netbiosDomain, computer), journal);
+  membership.Prepare();
   try {
-    membership.Begin();
+    membership.Configure();
     Secret blob;
     call.log.Run("provision", "making the computer account on " + found.controller, [&] {
       blob = netapi::ProvisionAccount(domain, computer, found.organizationalUnitDn, found.controller, user,
@@ -196,8 +201,9 @@ std::string JoinWithMachineAccount(const Call& call) {
   });
   const Journal journal{Journal::Operation::kJoin, domain, netbiosDomain, computer, false};
   Membership membership(call, MemberState(domain, netbiosDomain, computer), journal);
+  membership.Prepare();
   try {
-    membership.Begin();
+    membership.Configure();
     membership.StoreSecrets(call.request.secret);
     membership.StartService();
     membership.Finish("");

@@ -89,6 +89,7 @@ void FinishLeave(const AttemptLog& log) {
     state.netbiosDomain.clear();
     state.hostName.clear();
     state.machineAccountDn.clear();
+    state.preferredDomainControllers.clear();
     SaveState(state);
     return "the host has joined no domain";
   });

@@ -59,6 +59,7 @@ class Precheck {
       try {
         directory_ = std::make_unique<Directory>(controllers[index], kLdapTimeout);
         root_ = directory_->ReadRootEntry();
+        RequireDomain();
         controller_ = root_.controllerDnsName.empty() ? controllers[index] : root_.controllerDnsName;
         offset_ = root_.currentTime - time(nullptr);
         return;
@@ -67,6 +68,12 @@ class Precheck {
       }
     }
     throw Failure(kNoLogonServers, "no domain controller answers" + reasons);
+  }
+
+  // A preferred controller may be one of another domain.
+  void RequireDomain() const {
+    if (EqualWithoutCase(root_.baseDn, DomainDn(request_.Text("dnsDomain")))) return;
+    throw Failure(kNoLogonServers, "serves another domain, " + root_.baseDn);
   }
 
   void CheckPassword() {
