@@ -15,7 +15,10 @@ struct Region {
   const char* end;
 };
 
-/// Every region that can be read and written, except what is no plain memory.
+/// Larger ones are the shadow memory of a sanitizer.
+constexpr std::uintptr_t LARGEST_REGION = std::uintptr_t{1} << 30U;
+
+/// Every region of the program that can be read and written.
 std::vector<Region> WritableRegions() {
   std::ifstream maps("/proc/self/maps");
   std::vector<Region> regions;
@@ -26,7 +29,7 @@ std::vector<Region> WritableRegions() {
     char dash = 0;
     std::string permissions;
     words >> std::hex >> begin >> dash >> end >> permissions;
-    if (permissions.starts_with("rw")) {
+    if (permissions.starts_with("rw") && end - begin < LARGEST_REGION) {
       regions.push_back({reinterpret_cast<const char*>(begin), reinterpret_cast<const char*>(end)});
     }
   }
