@@ -1,6 +1,7 @@
 // The table that the library binds: turns the plug-in's exceptions into statuses.
 #include <syslog.h>
 
+#include <algorithm>
 #include <cstdlib>
 #include <cstring>
 #include <memory>
@@ -29,7 +30,7 @@ using Result = std::unique_ptr<char, Release>;
 Result CopyOf(const SecretString& text) {
   Result copy(static_cast<char*>(std::calloc(text.size() + 1, 1)));
   if (!copy) throw std::bad_alloc();
-  std::memcpy(copy.get(), text.data(), text.size());
+  std::copy(text.begin(), text.end(), copy.get());
   return copy;
 }
 
