@@ -1,5 +1,4 @@
 /* A plug-in that does harm while it is loaded, or names no modules; which one is a matter of the build. */
-#include <signal.h>
 #include <stdlib.h>
 #include <unistd.h>
 
@@ -8,7 +7,7 @@
 #if defined(BAD_CRASH) || defined(BAD_EXIT) || defined(BAD_HANG)
 __attribute__((constructor)) static void doHarm(void) {
 #if defined(BAD_CRASH)
-  raise(SIGSEGV);
+  abort();
 #elif defined(BAD_EXIT)
   _exit(0);
 #else

@@ -51,7 +51,8 @@ TEST_F(StatusTest, ShowsEverythingAsJson) {
         {"dnsName": "other.example", "netbiosName": "OTHER", "relationship": "two-way", "live": true},
         {"dnsName": "third.example", "netbiosName": "THIRD", "relationship": "inbound", "live": true}
       ],
-      "trustedDomainsLive": true
+      "trustedDomainsLive": true,
+      "failures": []
     },
     "live": true
   })"));
@@ -184,6 +185,29 @@ TEST_F(StatusTest, KnowsALateAnswerThatALaterQuestionShares) {
   // It asks for the trusted domains too, but its own answer came in time.
   EXPECT_EQ(domain["trustStateLive"], true);
   EXPECT_EQ(domain["trustState"], "healthy");
+}
+
+TEST_F(StatusTest, ShowsTheRestWhenOneQuestionFails) {
+  MakeComplete();
+  Script("status.getTrustedDomains", "1311");
+  const Outcome outcome = Velmorctl({"status", "--json"});
+  EXPECT_EQ(outcome.exitCode, 8);
+  const nlohmann::json domain = outcome.Json()["domain"];
+  EXPECT_EQ(domain["trustState"], "healthy");
+  EXPECT_EQ(domain["domainController"], "dc1.corp.example");
+  EXPECT_EQ(domain["failures"][0]["question"], "trusted domains");
+}
+
+TEST_F(StatusTest, IsTheTrustsExitCodeWhenAQuestionFailsToo) {
+  MakeComplete();
+  Script("status.getTrustedDomains", "1062");
+  Script("status.getAnyDomainController", "1062");
+  Script("trustState", "4");
+  const Outcome outcome = Velmorctl({"status"});
+  EXPECT_EQ(outcome.exitCode, 4);
+  EXPECT_NE(outcome.output.find("Failed:                 domain controller: Exception 0x00000426: "),
+            std::string::npos)
+      << outcome.output;
 }
 
 TEST_F(StatusTest, IsElevenWhenTheRecordCannotBeRead) {

@@ -28,6 +28,14 @@ Json AsJson(const TrustedDomain& trusted) {
           {"live", trusted.relationship.live}};
 }
 
+Json FailuresAsJson(const Status& status) {
+  Json failures = Json::array();
+  for (const FailedQuestion& failure : status.failures) {
+    failures.push_back({{"question", failure.question}, {"reason", failure.reason}});
+  }
+  return failures;
+}
+
 Json DomainAsJson(const Status& status) {
   const auto& configuration = status.configuration.value;
   Json trustedDomains = Json::array();
@@ -44,7 +52,8 @@ Json DomainAsJson(const Status& status) {
       {"trustState", TrustStateName(status.trustState.value)},
       {"trustStateLive", status.trustState.live},
       {"trustedDomains", trustedDomains},
-      {"trustedDomainsLive", status.trustedDomains.live}};
+      {"trustedDomainsLive", status.trustedDomains.live},
+      {"failures", FailuresAsJson(status)}};
 }
 
 Json AsJson(const Status& status) {
@@ -92,7 +101,10 @@ void AddDomainRows(Rows& rows, const Status& status) {
     bool live = status.trustedDomains.live;
     rows.push_back({"Trusted domains:", Marked(live ? "none" : "", live)});
   }
-  rows.push_back({"Answers:", status.Live() ? "live" : "some are from the cache"});
+  rows.push_back({"Answers:", status.Live() ? "live" : "some are missing or from the cache"});
+  for (const FailedQuestion& failure : status.failures) {
+    rows.push_back({"Failed:", failure.question + ": " + failure.reason});
+  }
 }
 
 Rows StatusRows(const Status& status) {

@@ -2,7 +2,9 @@
 
 #include <algorithm>
 
+#include "authentication/exception.h"
 #include "failure.h"
+#include "meanings.h"
 #include "plugin_file.h"
 #include "settings_file.h"
 #include "trust_names.h"
@@ -21,19 +23,34 @@ std::optional<std::string> ProviderProblem(const SettingsInspection& settings) {
   return problem->file + ": " + problem->reason;
 }
 
+/// Asks one question; the answer is empty when it fails.
+template <class Question>
+auto Attempt(Status& status, const char* name, Question ask) -> decltype(ask()) {
+  try {
+    return ask();
+  } catch (const quenix::authentication::Exception& exception) {
+    status.failures.push_back({name, exception.what(), MeaningOf(exception).code});
+    return {};
+  }
+}
+
+Answer<std::vector<TrustedDomain>> TrustedDomainsOf(Directory& directory) {
+  auto domains = directory.TrustedDomains();
+  return {WithRelationships(directory, domains.value), domains.live};
+}
+
 void AskProvider(Status& status, Directory& directory) {
   status.configuration = directory.Configuration();
   if (status.DomainName().empty()) {
     return;
   }
-  Answer<std::deque<quenix::authentication::Domain>> domains = directory.TrustedDomains();
-  status.trustState = directory.State();
+  status.trustState = Attempt(status, "trust state", [&] { return directory.State(); });
   if (!status.Joined()) {
     return;
   }
-  status.trustedDomains.live = domains.live;
-  status.trustedDomains.value = WithRelationships(directory, domains.value);
-  status.domainController = directory.ControllerOf(status.DomainName());
+  status.trustedDomains = Attempt(status, "trusted domains", [&] { return TrustedDomainsOf(directory); });
+  status.domainController =
+      Attempt(status, "domain controller", [&] { return directory.ControllerOf(status.DomainName()); });
 }
 
 }  // namespace
@@ -76,6 +93,9 @@ ExitCode Status::Code() const {
   ExitCode trust = TrustStateExitCode(trustState.value);
   if (trustState.live && trust != ExitCode::Fine) {
     return trust;
+  }
+  if (!failures.empty()) {
+    return failures.front().code;
   }
   return Live() ? ExitCode::Fine : ExitCode::FromCache;
 }

@@ -23,6 +23,13 @@ struct TrustedDomain {
 std::vector<TrustedDomain> WithRelationships(Directory& directory,
                                              const std::deque<quenix::authentication::Domain>& domains);
 
+/// A question that failed, rather than being answered late.
+struct FailedQuestion {
+  std::string question;
+  std::string reason;
+  ExitCode code;
+};
+
 struct Status {
   std::string store;
   std::string provider;                /// empty when none is configured
@@ -32,6 +39,7 @@ struct Status {
   Answer<TrustState> trustState;
   std::optional<std::string> domainController;  /// nothing when there was no answer in time
   Answer<std::vector<TrustedDomain>> trustedDomains;
+  std::vector<FailedQuestion> failures;
 
   /// The joined domain's DNS name: the provider's or, when that gives none, the recorded one.
   std::string DomainName() const;
@@ -43,9 +51,9 @@ struct Status {
   ExitCode Code() const;
 };
 
-/// Asks for everything. Throws Failure when the active store cannot be told, and what loading the provider
-/// throws when the active store needs it; a host whose store is "None" may have a provider that cannot be
-/// used, or none.
+/// Asks for everything; a question that fails does not keep the others from being asked. Throws Failure when
+/// the active store cannot be told, and what loading the provider throws when the active store needs it; a
+/// host whose store is "None" may have a provider that cannot be used, or none.
 Status CollectStatus(std::chrono::seconds timeout);
 
 }  // namespace velmorctl
