@@ -2,7 +2,7 @@
 import json
 import re
 
-from lab import ADMINISTRATOR_PASSWORD, RECORD, USER_PASSWORD, LabTest
+from lab import ADMINISTRATOR_PASSWORD, RECORD, SOURCE, USER_PASSWORD, LabTest
 
 UNIT = "OU=Hosts,OU=Servers,DC=corp,DC=example"
 
@@ -55,7 +55,9 @@ class JoinTest(LabTest):
     def testNoPasswordIsLeftOnTheHost(self):
         self.host.must_join()
         found = self.host.run("grep", "-rlF", ADMINISTRATOR_PASSWORD, "/etc", "/var/lib", "/var/log", "/run", "/tmp")
-        self.assertEqual(found.stdout, "")
+        # The lab's own description may lie below /tmp, and it names the password.
+        left = [path for path in found.stdout.splitlines() if not path.startswith(f"{SOURCE}/")]
+        self.assertEqual(left, [])
 
     def testProgressIsToldWithTheProvidersRecord(self):
         done = self.host.join()
