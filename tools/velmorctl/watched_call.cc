@@ -57,12 +57,30 @@ class BackgroundCall {
   int ended_;
 };
 
+/// A thread that is waited for with Join(), and otherwise left to itself.
+class LeavableThread {
+ public:
+  explicit LeavableThread(std::function<void()> run) : thread_(std::move(run)) {}
+  LeavableThread(const LeavableThread&) = delete;
+  LeavableThread& operator=(const LeavableThread&) = delete;
+  ~LeavableThread() {
+    if (thread_.joinable()) {
+      thread_.detach();
+    }
+  }
+
+  void Join() { thread_.join(); }
+
+ private:
+  std::thread thread_;
+};
+
 }  // namespace
 
 CallOutcome RunWatched(std::function<void()> call, Progress& progress, SignalPipe& signals,
                        const std::string& onSignal) {
   auto background = std::make_shared<BackgroundCall>(std::move(call));
-  std::thread([background] { background->Run(); }).detach();
+  LeavableThread thread([background] { background->Run(); });
   pollfd waits[] = {{background->Descriptor(), POLLIN, 0}, {signals.Descriptor(), POLLIN, 0}};
   CallOutcome outcome;
   while (waits[0].revents == 0) {
@@ -79,6 +97,8 @@ CallOutcome RunWatched(std::function<void()> call, Progress& progress, SignalPip
       progress.Step(onSignal);
     }
   }
+  // The libraries that the call used take their leave of the thread before the process may end.
+  thread.Join();
   outcome.failure = background->Failure();
   return outcome;
 }
