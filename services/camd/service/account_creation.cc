@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <ctime>
+#include <utility>
 
 #include "common/status.h"
 #include "service/host_name.h"
@@ -70,7 +71,8 @@ std::optional<WebAnswer> AccountCreation::Check(Task& task, Order& order) {
 }
 
 // The order is this operation's own, so that its name is free again before the client has the answer.
-WebAnswer AccountCreation::Carry(const Task& task, Order order) {
+WebAnswer AccountCreation::Carry(const Task& task, Order&& handedOver) {
+  const Order order = std::move(handedOver);
   const int64_t now = time(nullptr);
   if (!order.tokenId.empty() && !tokens_.Claim(order.tokenId, order.hostName, now)) {
     return FailureAnswer(401, kLogonFailure, "the token has been used");

@@ -37,7 +37,7 @@ class AccountCreation {
 
   // Has the directory make the account. The ledger knows of it before the directory is asked, and of its
   // outcome before this returns. Throws Failure and DatabaseError.
-  WebAnswer Carry(const Task& task, Order order);
+  WebAnswer Carry(const Task& task, Order&& handedOver);
 
  private:
   std::optional<WebAnswer> CheckToken(const Task& task, Order& order);
