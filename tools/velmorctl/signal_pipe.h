@@ -17,7 +17,7 @@ namespace velmorctl {
 class SignalPipe {
  public:
   /// Throws std::system_error when the pipe cannot be made.
-  explicit SignalPipe(std::initializer_list<int> signalNumbers);
+  SignalPipe(std::initializer_list<int> signalNumbers);
   SignalPipe(const SignalPipe&) = delete;
   SignalPipe& operator=(const SignalPipe&) = delete;
 
