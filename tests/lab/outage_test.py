@@ -42,8 +42,8 @@ class FrozenControllerTest(Outage):
     @classmethod
     def note_outage(cls):
         with cls.member.questioner(STORE_TIMEOUT) as store:
-            cls.domains_before = store.ask("trusted-domains")
-            cls.state_before = store.ask("trust-state")
+            cls.seconds_to_answer = (store.ask_until("trusted-domains", "other.example", 120) +
+                                     store.ask_until("trust-state", HEALTHY, 120))
             cls.lab.command("freeze", "dc1")
             try:
                 with concurrent.futures.ThreadPoolExecutor() as others:
@@ -64,7 +64,7 @@ class FrozenControllerTest(Outage):
         cls.log = cls.member.read("/var/log/syslog")
 
     def testAnswersComeFromTheDirectoryBefore(self):
-        self.assertEqual((self.state_before.text, self.domains_before.text), (HEALTHY, "other.example"))
+        self.assertLess(self.seconds_to_answer, 240)
 
     def testTrustedDomainsAreAnsweredInTime(self):
         self.assertEqual(self.domains_in_outage.text, "other.example")
