@@ -42,8 +42,9 @@ class FrozenControllerTest(Outage):
     @classmethod
     def note_outage(cls):
         with cls.member.questioner(STORE_TIMEOUT) as store:
-            cls.seconds_to_answer = (store.ask_until("trusted-domains", "other.example", 120) +
-                                     store.ask_until("trust-state", HEALTHY, 120))
+            store.ask_until("trust-state", HEALTHY, 120)
+            cls.domains_before = store.ask("trusted-domains")
+            cls.state_before = store.ask("trust-state")
             cls.lab.command("freeze", "dc1")
             try:
                 with concurrent.futures.ThreadPoolExecutor() as others:
@@ -64,7 +65,7 @@ class FrozenControllerTest(Outage):
         cls.log = cls.member.read("/var/log/syslog")
 
     def testAnswersComeFromTheDirectoryBefore(self):
-        self.assertLess(self.seconds_to_answer, 240)
+        self.assertEqual((self.state_before.text, self.domains_before.text), (HEALTHY, "other.example"))
 
     def testTrustedDomainsAreAnsweredInTime(self):
         self.assertEqual(self.domains_in_outage.text, "other.example")
@@ -107,7 +108,8 @@ class UnpluggedControllerTest(Outage):
     def note_outage(cls):
         cls.stranger.must_join()
         with cls.member.questioner(60) as store:
-            cls.seconds_to_answer = store.ask_until("trust-state", HEALTHY, 120)
+            store.ask_until("trust-state", HEALTHY, 120)
+            cls.state_before = store.ask("trust-state")
             cls.lab.command("link", "dc1", "down")
             try:
                 with concurrent.futures.ThreadPoolExecutor() as others:
@@ -120,7 +122,7 @@ class UnpluggedControllerTest(Outage):
             cls.seconds_to_recover = store.ask_until("trust-state", HEALTHY, 120)
 
     def testTrustIsNotHealthyMeanwhile(self):
-        self.assertLess(self.seconds_to_answer, 120)
+        self.assertEqual(self.state_before.text, HEALTHY)
         self.assertNotEqual(self.state_in_outage.text, HEALTHY)
 
     def testTrustIsHealthyAgainAfterwards(self):
