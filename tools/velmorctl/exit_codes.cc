@@ -18,6 +18,7 @@ constexpr ExitCodeMeaning meanings[] = {
     {ExitCode::Conflict, "a conflict with another command, host or domain"},
     {ExitCode::Configuration, "a configuration file or the configuration store cannot be used"},
     {ExitCode::Proxy, "the join proxy failed"},
+    {ExitCode::Difference, "a check or a comparison found a difference"},
     {ExitCode::NeedsRoot, "only root may do this"},
 };
 

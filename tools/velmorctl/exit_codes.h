@@ -21,6 +21,7 @@ enum class ExitCode : int {
   Conflict = 10,
   Configuration = 11,
   Proxy = 12,
+  Difference = 13,
   NeedsRoot = 77
 };
 

@@ -1,0 +1,27 @@
+/// What every command that changes system files does alike.
+#ifndef VELMORCTL_SYSTEM_FILE_EDIT_COMMAND_H
+#define VELMORCTL_SYSTEM_FILE_EDIT_COMMAND_H
+
+#include <CLI/App.hpp>
+#include <string>
+
+#include "exit_codes.h"
+#include "situation.h"
+#include "system_file/change_set.h"
+
+namespace velmorctl {
+
+/// Adds the flag --dry-run.
+void AddDryRunFlag(CLI::App& command, bool& dryRun);
+
+/// Prints the planned changes as a unified diff and, unless `dryRun`, makes them and tells how to undo them.
+/// Says so when there is nothing to change. Throws Failure: NeedsRoot when the running system is to be
+/// changed by another user, and what ChangeSet::Apply() throws.
+ExitCode ShowAndApply(const ChangeSet& changes, const RootFolder& root, bool dryRun, Situation& situation);
+
+/// Prints the planned changes as a unified diff and changes nothing: Difference, or Fine when there are none.
+ExitCode ShowDifference(const ChangeSet& changes);
+
+}  // namespace velmorctl
+
+#endif  // VELMORCTL_SYSTEM_FILE_EDIT_COMMAND_H

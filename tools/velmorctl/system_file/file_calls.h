@@ -1,0 +1,49 @@
+/// System calls on files that several parts of the editing need.
+#ifndef VELMORCTL_SYSTEM_FILE_FILE_CALLS_H
+#define VELMORCTL_SYSTEM_FILE_FILE_CALLS_H
+
+#include <sys/types.h>
+
+#include <string>
+#include <string_view>
+
+namespace velmorctl {
+
+/// Owns an open file descriptor and closes it.
+class OpenFile {
+ public:
+  /// Takes over `descriptor`; -1 stands for none.
+  explicit OpenFile(int descriptor) : descriptor_(descriptor) {}
+  OpenFile(const OpenFile&) = delete;
+  OpenFile& operator=(const OpenFile&) = delete;
+  ~OpenFile();
+
+  bool IsOpen() const { return descriptor_ >= 0; }
+  int Descriptor() const { return descriptor_; }
+
+ private:
+  int descriptor_;
+};
+
+/// A failure (Configuration) of a call on a file: "cannot DOING 'PATH': " and the system's text. Only root
+/// may do it when the system refuses it to another user.
+[[noreturn]] void ThrowFileFailure(const std::string& doing, const std::string& path, int errorNumber);
+
+bool IsFolder(const std::string& path);
+
+/// Makes the folder with this mode, whatever the umask. No failure when there is one. Throws Failure.
+void MakeDurableFolder(const std::string& path, mode_t mode);
+
+/// Makes a file that does not exist yet, readable by its owner only, and its content durable; the folder's
+/// entry is not. Throws Failure.
+void WriteNewFile(const std::string& path, std::string_view content);
+
+/// Makes the entries of the folder durable. Throws Failure.
+void SyncFolder(const std::string& path);
+
+/// The folder that a file lies in.
+std::string FolderOf(const std::string& path);
+
+}  // namespace velmorctl
+
+#endif  // VELMORCTL_SYSTEM_FILE_FILE_CALLS_H
