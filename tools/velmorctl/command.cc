@@ -17,7 +17,8 @@ constexpr AddCommand commands[] = {AddStatusCommand,
                                    AddDomainControllerCommand,
                                    AddSmartCardCommand,
                                    AddOptionCommand,
-                                   AddCamCommand};
+                                   AddCamCommand,
+                                   AddNameServiceCommand};
 
 }  // namespace
 

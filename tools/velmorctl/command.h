@@ -34,6 +34,7 @@ void AddDomainControllerCommand(CLI::App& root, Invocation& invocation);
 void AddSmartCardCommand(CLI::App& root, Invocation& invocation);
 void AddOptionCommand(CLI::App& root, Invocation& invocation);
 void AddCamCommand(CLI::App& root, Invocation& invocation);
+void AddNameServiceCommand(CLI::App& root, Invocation& invocation);
 
 /// Lets the selection of `command` run `run` with the options that were read for it.
 template <class Options>
