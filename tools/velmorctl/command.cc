@@ -18,7 +18,8 @@ constexpr AddCommand commands[] = {AddStatusCommand,
                                    AddSmartCardCommand,
                                    AddOptionCommand,
                                    AddCamCommand,
-                                   AddNameServiceCommand};
+                                   AddNameServiceCommand,
+                                   AddPamCommand};
 
 }  // namespace
 

@@ -35,6 +35,7 @@ void AddSmartCardCommand(CLI::App& root, Invocation& invocation);
 void AddOptionCommand(CLI::App& root, Invocation& invocation);
 void AddCamCommand(CLI::App& root, Invocation& invocation);
 void AddNameServiceCommand(CLI::App& root, Invocation& invocation);
+void AddPamCommand(CLI::App& root, Invocation& invocation);
 
 /// Lets the selection of `command` run `run` with the options that were read for it.
 template <class Options>

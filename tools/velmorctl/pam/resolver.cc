@@ -230,13 +230,12 @@ class ServiceResolver {
 
  private:
   struct Definition {
-    bool found = false;
-    bool usable = true;
     std::string file;
+    std::string content;
   };
 
   /// The first file of the service that can be opened counts.
-  Definition Define(const std::string& service, std::vector<Finding>& findings, Stacks& stacks) {
+  std::optional<Definition> Find(const std::string& service, std::vector<Finding>& findings) const {
     for (const char* folder : policyFolders) {
       std::string path = std::string(folder) + "/" + service;
       FileReading reading = read_(path);
@@ -247,43 +246,51 @@ class ServiceResolver {
                             reading.needsRoot ? "run the command as root" : "make it a readable text file"});
       }
       if (reading.content) {
-        return {true, FileResolver(read_, findings, stacks).Parse(path, *reading.content), path};
+        return Definition{path, std::move(*reading.content)};
       }
     }
-    return {};
+    return std::nullopt;
+  }
+
+  bool Parse(const std::optional<Definition>& definition, std::vector<Finding>& findings,
+             Stacks& stacks) const {
+    return !definition || FileResolver(read_, findings, stacks).Parse(definition->file, definition->content);
   }
 
   bool ResolveBoth() {
-    Definition own = Define(policy_.service, policy_.findings, policy_.stacks);
-    policy_.file = own.file;
-    if (!own.usable) {
+    std::optional<Definition> own = Find(policy_.service, policy_.findings);
+    policy_.file = own ? own->file : "";
+    if (!Parse(own, policy_.findings, policy_.stacks)) {
       return false;
     }
     // Deliberate: for "other" itself libpam reads the file twice, into the same stacks.
     bool isOther = policy_.service == otherService;
     Stacks otherStacks;
-    otherFindings_.clear();
-    Definition other = DefineOther(isOther ? policy_.stacks : otherStacks);
-    if (!own.found && !other.found) {
+    std::optional<Definition> other = Find(otherService, otherFindings_);
+    if (!own && !other) {
       policy_.findings.push_back({{std::string(policyFolders[0]) + "/" + policy_.service, 0},
                                   policy_.service,
                                   "there is no such service, and no service \"other\"",
                                   "make the file"});
+      return false;
     }
-    if (other.usable && !isOther) {
+    if (!ParseOther(other, isOther ? policy_.stacks : otherStacks)) {
+      return false;
+    }
+    if (!isOther) {
       FillFrom(otherStacks);
     }
-    return other.usable && (own.found || other.found);
+    return true;
   }
 
   /// What is wrong in "other" is this service's matter when it is used, or when it stops libpam.
-  Definition DefineOther(Stacks& stacks) {
+  bool ParseOther(const std::optional<Definition>& other, Stacks& stacks) {
     try {
-      Definition other = Define(otherService, otherFindings_, stacks);
-      if (!other.usable) {
+      bool usable = Parse(other, otherFindings_, stacks);
+      if (!usable) {
         TakeOtherFindings();
       }
-      return other;
+      return usable;
     } catch (const FatalPolicy&) {
       TakeOtherFindings();
       throw;

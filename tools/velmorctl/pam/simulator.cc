@@ -2,6 +2,8 @@
 
 #include <array>
 
+#include "pam/stack_walk.h"
+
 namespace velmorctl::pam {
 
 namespace {
@@ -14,6 +16,8 @@ enum class Impression { Undefined, Positive, Negative };
 struct State {
   Impression impression = Impression::Undefined;
   ReturnCode status = mustFail;
+
+  bool operator==(const State&) const = default;
 };
 
 bool GoesByFrozenChain(Operation operation) {
@@ -90,7 +94,9 @@ class Dispatch {
     } else {
       step.action = IsKnown(answer) ? ActionFor(entry.actions, *cached) : Action();
     }
+    State before = state_;
     step.badJump = !Apply(step.action, IsKnown(answer) ? answer : mustFail, *cached);
+    step.decided = state_ != before;
     step.verdict = state_.status;
     verdict_.trace.push_back(step);
   }
@@ -142,12 +148,7 @@ class Dispatch {
     }
   }
 
-  /// Passes over the rest of the stack or substack.
-  void LeaveStack() {
-    while (position_ + 1 < stack_.size() && stack_[position_ + 1].level >= level_) {
-      ++position_;
-    }
-  }
+  void LeaveStack() { position_ = LastOfStack(stack_, position_); }
 
   bool Jump(std::int32_t count, ReturnCode answer, ReturnCode cached) {
     if (frozen_ && IsOpen() && (answer != ReturnCode::Ignore || cached == answer)) {
@@ -156,17 +157,12 @@ class Dispatch {
       }
       state_.status = answer;
     }
-    // A substack is passed over as a whole and counts as one.
-    while (count > 0 && position_ + 1 < stack_.size() && stack_[position_ + 1].level >= level_) {
-      do {
-        ++position_;
-      } while (position_ + 1 < stack_.size() && stack_[position_ + 1].level > level_);
-      --count;
-    }
-    if (count > 0) {
+    JumpTarget target = TargetOfJump(stack_, position_, count);
+    position_ = target.last;
+    if (!target.inStack) {
       state_ = {Impression::Negative, mustFail};
     }
-    return count == 0;
+    return target.inStack;
   }
 
   const Stack& stack_;
@@ -199,13 +195,6 @@ Facility FacilityFor(Operation operation) {
 
 Verdict Simulate(const Stack& stack, Operation operation, const Answers& answers, FrozenChain& chain) {
   return Dispatch(stack, operation, answers, chain).Run();
-}
-
-Verdict SimulateTokenChange(const Stack& stack, const Answers& answers) {
-  FrozenChain chain;
-  Verdict verdict = Simulate(stack, Operation::PrepareTokenChange, answers, chain);
-  return verdict.code == ReturnCode::Success ? Simulate(stack, Operation::ChangeToken, answers, chain)
-                                             : verdict;
 }
 
 }  // namespace velmorctl::pam

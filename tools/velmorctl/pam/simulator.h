@@ -38,8 +38,9 @@ struct Step {
   std::size_t entry = 0;  /// index in the stack
   ReturnCode answer = ReturnCode::Success;
   Action action;         /// the one that counted
-  bool frozen = false;   /// the action was chosen by the answer to the operation before
+  bool frozen = false;   /// the action was chosen by another answer, that to the operation before
   bool badJump = false;  /// a jump that leads out of the stack or substack
+  bool decided = false;  /// it changed how the verdict stands
   ReturnCode verdict = ReturnCode::PermissionDenied;  /// how it stands after the entry
 };
 
@@ -55,9 +56,6 @@ using FrozenChain = std::vector<std::optional<ReturnCode>>;
 /// Runs the stack once. SetCredentials, CloseSession and ChangeToken go by the chain that the operation
 /// before them has left; the others fill it anew. A stack without entries is refused.
 Verdict Simulate(const Stack& stack, Operation operation, const Answers& answers, FrozenChain& chain);
-
-/// Both rounds of a change of password; the second one only when the first one succeeds.
-Verdict SimulateTokenChange(const Stack& stack, const Answers& answers);
 
 }  // namespace velmorctl::pam
 

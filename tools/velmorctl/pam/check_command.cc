@@ -1,0 +1,46 @@
+/// velmorctl pam check: whether the policies do what they should.
+#include <algorithm>
+
+#include "output.h"
+#include "pam/check.h"
+#include "pam/policy_root.h"
+#include "pam/subcommands.h"
+#include "system_file/findings.h"
+
+namespace velmorctl::pam {
+
+namespace {
+
+struct Options {
+  bool json = false;
+  std::string root = "/";
+};
+
+ExitCode Check(const Options& options, Situation&) {
+  PolicyRoot root{RootFolder(options.root)};
+  CheckedSystem system = root.System();
+  std::vector<Finding> found;
+  std::vector<FileProblem> problems;
+  for (const std::string& service : root.Services()) {
+    for (const Finding& finding : CheckService(service, system)) {
+      // What is wrong in an included file is found again with each service.
+      if (std::find(found.begin(), found.end(), finding) == found.end()) {
+        found.push_back(finding);
+        problems.push_back(root.Shown(finding));
+      }
+    }
+  }
+  return PrintFindings(problems, "velmor.pam-check/1", options.json);
+}
+
+}  // namespace
+
+void AddCheck(CLI::App& pam, Invocation& invocation) {
+  auto options = std::make_shared<Options>();
+  CLI::App* check = pam.add_subcommand("check", "Look for what is wrong with the policies");
+  AddRootOption(*check, options->root);
+  AddJsonFlag(*check, options->json);
+  Bind(*check, invocation, options, Check);
+}
+
+}  // namespace velmorctl::pam

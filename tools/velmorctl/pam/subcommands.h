@@ -1,0 +1,17 @@
+/// The subcommands of "velmorctl pam", each in a file of its own.
+#ifndef VELMORCTL_PAM_SUBCOMMANDS_H
+#define VELMORCTL_PAM_SUBCOMMANDS_H
+
+#include <CLI/App.hpp>
+
+#include "command.h"
+
+namespace velmorctl::pam {
+
+void AddShow(CLI::App& pam, Invocation& invocation);
+void AddCheck(CLI::App& pam, Invocation& invocation);
+void AddSimulate(CLI::App& pam, Invocation& invocation);
+
+}  // namespace velmorctl::pam
+
+#endif  // VELMORCTL_PAM_SUBCOMMANDS_H
