@@ -59,6 +59,37 @@ TEST_F(LedgerTest, RequestWithUnknownOutcomeIsFoundWithoutARecord) {
   EXPECT_EQ(ledger_.FindLatest("HOST1")->account.createdAfter, kNow);
 }
 
+TEST_F(LedgerTest, RequestWithUnknownOutcomeDoesNotCountBesideAnAccountThatWasGivenOut) {
+  ledger_.Interrupt(ledger_.Begin(RequestFor("HOST1"), kNow, 0, 0).value(), kNow);
+  const int64_t given = Give("HOST1", "S-1", kNow + 10);
+  ledger_.Interrupt(ledger_.Begin(RequestFor("HOST1"), kNow + 20, 0, 0).value(), kNow);
+  const auto entries = ledger_.FindOlderThan(kNow + 100);
+  ASSERT_EQ(entries.size(), 1U);
+  EXPECT_EQ(entries[0].id, given);
+  EXPECT_EQ(ledger_.FindLatest("HOST1")->id, given);
+}
+
+TEST_F(LedgerTest, RequestWithUnknownOutcomeDoesNotCountBesideAnAccountInUse) {
+  ledger_.Interrupt(ledger_.Begin(RequestFor("HOST1"), kNow, 0, 0).value(), kNow);
+  ledger_.MarkKept(Give("HOST1", "S-1", kNow + 10), kNow);
+  EXPECT_TRUE(ledger_.FindOlderThan(kNow + 100).empty());
+  EXPECT_FALSE(ledger_.FindLatest("HOST1"));
+}
+
+TEST_F(LedgerTest, RequestWithUnknownOutcomeCountsAgainWhenTheAccountWasRemoved) {
+  const int64_t interrupted = ledger_.Begin(RequestFor("HOST1"), kNow, 0, 0).value();
+  ledger_.Interrupt(interrupted, kNow);
+  ledger_.MarkRemoved(Give("HOST1", "S-1", kNow + 10), kNow);
+  ASSERT_EQ(ledger_.FindOlderThan(kNow + 100).size(), 1U);
+  EXPECT_EQ(ledger_.FindLatest("HOST1")->id, interrupted);
+}
+
+TEST_F(LedgerTest, AccountOfARequestWithUnknownOutcomeIsAsOldAsThatRequest) {
+  ledger_.Interrupt(ledger_.Begin(RequestFor("HOST1"), kNow, 0, 0).value(), kNow);
+  Give("HOST1", "S-1", kNow + 1000);
+  EXPECT_EQ(ledger_.FindLatest("HOST1")->account.createdAfter, kNow);
+}
+
 TEST_F(LedgerTest, AccountTakenOverIsAsOldAsItsFirstRequest) {
   Give("HOST1", "S-1", kNow);
   Give("HOST1", "S-1", kNow + 50);

@@ -2,8 +2,8 @@
 """Stands for the directory behind velmor-camd-helper. Works in the folder that it lies in.
 
 `behaviour` there holds JSON: "delay" (seconds before the answer), "wait-for" (a file that must exist before the
-answer), "status" and "text" (a failure), "crash", "garbage" or "silent". Each request is noted in `helper.log`
-without its secret, and each account that was made is a file in `accounts`.
+answer), "status" and "text" (a failure), "crash", "garbage" or "silent"; with "only" for that computer alone. Each
+request is noted in `helper.log` without its secret, and each account that was made is a file in `accounts`.
 """
 import base64
 import json
@@ -29,6 +29,8 @@ def answer(blob=b"", **fields):
 try:
     behaviour = json.loads((folder / "behaviour").read_text(encoding="utf-8"))
 except FileNotFoundError:
+    behaviour = {}
+if behaviour.get("only", request.get("computer")) != request.get("computer"):
     behaviour = {}
 time.sleep(behaviour.get("delay", 0))
 while "wait-for" in behaviour and not (folder / behaviour["wait-for"]).exists():

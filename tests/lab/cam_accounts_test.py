@@ -178,6 +178,51 @@ class CamUnusedAccountTest(CamAccountsTest):
         self.assertEqual(self.outcome(service, name), (201, 0))
 
 
+class CamUnknownOutcomeTest(CamAccountsTest):
+    """A request whose outcome nobody learnt, and an account of its name that is not what it left."""
+
+    SETTINGS = {"remove-unused-after-hours": 1, "existing-accounts": "own-unused", "helper-timeout-seconds": 1}
+
+    def interrupted(self, name):
+        """A service that asked for the name in vain, and works from then on."""
+        service = self.service()
+        service.stop()
+        service.write("helper", "#!/bin/sh\nexec sleep 100\n", "700")
+        service.write("camd.conf", service.configuration(
+            {"directory": self.SETTINGS | {"helper": f"{service.folder}/helper"}}))
+        service.start()
+        self.assertEqual(self.outcome(service, name), (504, 1460))
+        service.stop()
+        service.write("camd.conf", service.configuration(
+            {"directory": self.SETTINGS | {"helper-timeout-seconds": 60}}))
+        return service.start()
+
+    def testAccountThatSomebodyElseMadeMeanwhileIsKept(self):
+        name = self.name("n1")
+        service = self.interrupted(name)
+        self.directory.create_computer(name.upper(), f"{name}.corp.example")
+        self.assertEqual(self.look_for_unused_ones(service), [(name.upper(), "kept")])
+        self.assertIsNotNone(self.directory.computer(name.upper()))
+
+    def testAccountThatSomebodyElseMadeMeanwhileIsNotTakenOver(self):
+        name = self.name("n1")
+        service = self.interrupted(name)
+        self.directory.create_computer(name.upper(), f"{name}.corp.example")
+        self.assertEqual(self.outcome(service, name), (409, 2224))
+
+    def testAccountThatTheNextRequestGaveOutIsKeptWhenItHasLoggedOn(self):
+        service = self.interrupted(self.host.name)
+        code, body = self.create(service, self.host.name)
+        self.assertEqual(code, 201, body)
+        self.host.write("/etc/samba/smb.conf", SMB_CONF)
+        self.host.write("/run/blob", body["joinBlob"])
+        self.host.must("net", "offlinejoin", "requestodj", "loadfile=/run/blob")
+        self.host.must("net", "ads", "testjoin", "-P")
+        self.assertEqual(self.look_for_unused_ones(service),
+                         [(self.host.account, "interrupted"), (self.host.account, "kept")])
+        self.host.must("net", "ads", "testjoin", "-P")
+
+
 class CamTakeOverTest(CamAccountsTest):
 
     SETTINGS = {"existing-accounts": "own-unused"}

@@ -48,6 +48,24 @@ void Check(LDAP* connection, int error, const char* action) {
   throw Failure(StatusOf(error), text);
 }
 
+// Makes a search show the owner in a security descriptor. Without it the controller would be asked for the
+// audit entries too, which few may see, and would show nothing.
+class OwnerOnly {
+ public:
+  OwnerOnly() : control_{oid_.data(), {static_cast<ber_len_t>(value_.size()), value_.data()}, 0} {}
+  OwnerOnly(const OwnerOnly&) = delete;
+  OwnerOnly& operator=(const OwnerOnly&) = delete;
+
+  LDAPControl** Controls() { return controls_; }
+
+ private:
+  std::string oid_ = "1.2.840.113556.1.4.801";
+  // A sequence of one number, the flag of the owner.
+  std::string value_ = {0x30, 0x03, 0x02, 0x01, 0x01};
+  LDAPControl control_;
+  LDAPControl* controls_[2] = {&control_, nullptr};
+};
+
 // Searches; nothing when the base does not exist.
 Message Search(LDAP* connection, const std::string& base, int scope, const std::string& filter,
                std::vector<std::string> attributes) {
@@ -55,8 +73,9 @@ Message Search(LDAP* connection, const std::string& base, int scope, const std::
   for (std::string& attribute : attributes) names.push_back(attribute.data());
   names.push_back(nullptr);
   LDAPMessage* found = nullptr;
+  OwnerOnly ownerOnly;
   const int error = ldap_search_ext_s(connection, base.c_str(), scope, filter.c_str(), names.data(), 0,
-                                      nullptr, nullptr, nullptr, 0, &found);
+                                      ownerOnly.Controls(), nullptr, nullptr, 0, &found);
   Message message(found);
   if (error == LDAP_NO_SUCH_OBJECT) return nullptr;
   Check(connection, error, "refused a search");
@@ -93,6 +112,17 @@ std::string NameOf(LDAP* connection, LDAPMessage* entry) {
   const std::string name = dn == nullptr ? "" : dn;
   ldap_memfree(dn);
   return name;
+}
+
+// A text as a value in a filter.
+std::string ForFilter(std::string text) {
+  berval plain = {static_cast<ber_len_t>(text.size()), text.data()};
+  berval escaped = {0, nullptr};
+  if (ldap_bv2escaped_filter_value(&plain, &escaped) != 0)
+    throw Failure(kNotEnoughMemory, "not enough memory");
+  std::string result(escaped.bv_val, escaped.bv_len);
+  if (escaped.bv_val != plain.bv_val) ldap_memfree(escaped.bv_val);
+  return result;
 }
 
 // GSSAPI asks for nothing: the ticket says who we are.
@@ -132,6 +162,21 @@ std::string SidText(const std::string& bytes) {
     text += "-" + std::to_string(at(index) | at(index + 1) << 8 | at(index + 2) << 16 | at(index + 3) << 24);
   }
   return text;
+}
+
+std::string OwnerText(const std::string& descriptor) {
+  constexpr size_t kHeaderSize = 20;
+  constexpr size_t kPlaceOfOwner = 4;
+  constexpr size_t kSmallestSid = 8;
+  if (descriptor.size() < kHeaderSize) return "";
+  size_t begin = 0;
+  for (size_t index = 4; index > 0; --index) {
+    begin = begin << 8 | static_cast<unsigned char>(descriptor[kPlaceOfOwner + index - 1]);
+  }
+  if (begin == 0 || begin > descriptor.size() - kSmallestSid) return "";
+  const size_t size =
+      kSmallestSid + 4 * static_cast<size_t>(static_cast<unsigned char>(descriptor[begin + 1]));
+  return size > descriptor.size() - begin ? "" : SidText(descriptor.substr(begin, size));
 }
 
 Directory::Directory(const std::string& controller, std::chrono::seconds timeout) {
@@ -186,10 +231,17 @@ std::string Directory::DomainSid(const RootEntry& root) {
   return SidText(Value(connection_, entry, "objectSid"));
 }
 
+std::string Directory::UserSid(const RootEntry& root, const std::string& user) {
+  const Message message = Search(connection_, root.baseDn, LDAP_SCOPE_SUBTREE,
+                                 "(sAMAccountName=" + ForFilter(user) + ")", {"objectSid"});
+  LDAPMessage* entry = FirstEntry(connection_, message);
+  return entry == nullptr ? "" : SidText(Value(connection_, entry, "objectSid"));
+}
+
 std::optional<ComputerAccount> Directory::FindComputer(const RootEntry& root, const std::string& computer) {
   const Message message =
       Search(connection_, root.baseDn, LDAP_SCOPE_SUBTREE, "(sAMAccountName=" + computer + "$)",
-             {"objectSid", "pwdLastSet", "lastLogon", "logonCount", "whenCreated"});
+             {"objectSid", "pwdLastSet", "lastLogon", "logonCount", "whenCreated", "nTSecurityDescriptor"});
   LDAPMessage* entry = FirstEntry(connection_, message);
   if (entry == nullptr) return std::nullopt;
   ComputerAccount account;
@@ -199,6 +251,7 @@ std::optional<ComputerAccount> Directory::FindComputer(const RootEntry& root, co
   account.lastLogon = NumberValue(connection_, entry, "lastLogon");
   account.logonCount = NumberValue(connection_, entry, "logonCount");
   account.created = TimeValue(connection_, entry, "whenCreated");
+  account.owner = OwnerText(Value(connection_, entry, "nTSecurityDescriptor"));
   return account;
 }
 

@@ -26,6 +26,7 @@ struct ComputerAccount {
   int64_t lastLogon = 0;    // as this controller saw it; others do not learn of it; 0 for never
   int64_t logonCount = 0;
   int64_t created = 0;  // seconds since 1970
+  std::string owner;    // the identifier of who made it; empty when we may not see that
 };
 
 // The domain controllers that DNS names for the domain, best first. Throws Failure (kNoLogonServers) when it
@@ -35,6 +36,9 @@ std::vector<std::string> ControllersOf(const std::string& domain);
 // The text of a binary security identifier ("S-1-5-..."). Throws Failure (kInternalError) for bytes that are
 // none.
 std::string SidText(const std::string& bytes);
+
+// The same of the owner that a security descriptor names; empty when it names none.
+std::string OwnerText(const std::string& descriptor);
 
 // A connection to one controller. Every operation waits for at most the time-out of the constructor and
 // throws Failure: kNoLogonServers when the controller does not answer, kAccessDenied, kInvalidContainer,
@@ -54,6 +58,8 @@ class Directory {
 
   std::string NetbiosName(const RootEntry& root);
   std::string DomainSid(const RootEntry& root);
+  // The identifier of the user with this name; empty when there is none.
+  std::string UserSid(const RootEntry& root, const std::string& user);
   // The account with this name, which is a valid computer name.
   std::optional<ComputerAccount> FindComputer(const RootEntry& root, const std::string& computer);
   bool Exists(const std::string& dn);

@@ -16,8 +16,9 @@
 // "logonCount". Provisioning itself logs on with a new account, and controllers do not tell each other of
 // log-ons: an account is unused when the controller of the record still gives the same, no other one has seen
 // it log on, and it was not made before "createdAfter" (seconds since 1970). Without a "sid" the record is
-// that of a request whose outcome nobody learnt; then nothing may have happened to the account since the time
-// that making it takes.
+// that of a request whose outcome nobody learnt; then the account must be of our own user's making, from the
+// time when that request may have run, and nothing may have happened to it since the time that making it
+// takes.
 #include "common/message.h"
 #include "common/status.h"
 #include "helper/container.h"
@@ -34,6 +35,8 @@ constexpr std::chrono::minutes kProvisioningTimeout(2);
 constexpr int64_t kClockSkewSeconds = 300;
 // How long the provisioning of one account may have taken.
 constexpr int64_t kMakingSeconds = 120;
+// How long a request may have run; more cannot be configured.
+constexpr int64_t kLongestRequestSeconds = 600;
 
 std::string UpperCase(std::string text) {
   for (char& byte : text) byte = static_cast<char>(byte >= 'a' && byte <= 'z' ? byte - 32 : byte);
@@ -62,8 +65,10 @@ Connection Connect(const Message& request) {
   for (const std::string& controller : controllers) {
     try {
       Directory directory(controller, kControllerTimeout);
-      const RootEntry root = directory.ReadRootEntry();
+      directory.ReadRootEntry();
       directory.Bind();
+      // Once more: what it said before it showed who it is decides nothing.
+      const RootEntry root = directory.ReadRootEntry();
       return {std::move(directory), root};
     } catch (const Failure& failure) {
       if (failure.Code() != kNoLogonServers) throw;
@@ -129,14 +134,21 @@ Message Provision(const Message& request, Connection& connection, const std::str
   }
 }
 
+// Whether the account is what a request left that never learnt its outcome. Somebody else may have made one
+// of the same name since, which also logs on in its first minutes.
+bool LooksLeftBehind(const ComputerAccount& account, const Message& request, const std::string& ourSid) {
+  if (ourSid.empty() || account.owner != ourSid) return false;
+  const int64_t latest = request.Number("createdAfter") + kLongestRequestSeconds + kClockSkewSeconds;
+  const int64_t madeUntil = FileTimeOf(account.created + kMakingSeconds);
+  return account.created <= latest && account.passwordSet <= madeUntil && account.lastLogon <= madeUntil;
+}
+
 // Whether one controller knows of nothing that happened to the account since it was made.
-bool LooksUntouched(const ComputerAccount& account, const Message& request, bool isRecorder) {
+bool LooksUntouched(const ComputerAccount& account, const Message& request, const std::string& ourSid,
+                    bool isRecorder) {
   const std::string sid = request.Text("sid");
   if (account.created + kClockSkewSeconds < request.Number("createdAfter")) return false;
-  if (sid.empty()) {
-    const int64_t madeUntil = FileTimeOf(account.created + kMakingSeconds);
-    return account.passwordSet <= madeUntil && account.lastLogon <= madeUntil;
-  }
+  if (sid.empty()) return LooksLeftBehind(account, request, ourSid);
   if (account.sid != sid || account.passwordSet != request.Number("passwordSet")) return false;
   if (!isRecorder) return account.lastLogon == 0;
   return account.lastLogon == request.Number("lastLogon") &&
@@ -147,14 +159,15 @@ bool LooksUntouched(const ComputerAccount& account, const Message& request, bool
 bool IsUnused(const Message& request, Connection& connection) {
   const std::string computer = request.Text("computer");
   const std::string recorder = request.Text("recordedBy");
+  const std::string ourSid = connection.directory.UserSid(connection.root, request.Text("user"));
   bool recorderAsked = request.Text("sid").empty();
   for (const std::string& controller : ControllersOf(request.Text("domain"))) {
     Directory directory(controller, kControllerTimeout);
-    const RootEntry root = directory.ReadRootEntry();
     directory.Bind();
+    const RootEntry root = directory.ReadRootEntry();
     const auto account = directory.FindComputer(root, computer);
     const bool isRecorder = UpperCase(root.controller) == UpperCase(recorder);
-    if (account && !LooksUntouched(*account, request, isRecorder)) return false;
+    if (account && !LooksUntouched(*account, request, ourSid, isRecorder)) return false;
     recorderAsked = recorderAsked || isRecorder;
   }
   const auto account = connection.directory.FindComputer(connection.root, computer);

@@ -63,8 +63,9 @@ std::optional<WebAnswer> AccountCreation::Check(Task& task, Order& order) {
   if (!FitsAnyPattern(order.hostName, task.configuration->access.hostNames)) {
     return FailureAnswer(403, kAccessDenied, "the name is not on the list of allowed names");
   }
-  if (!Reserve(order)) {
-    return FailureAnswer(409, kAlreadyUnderWay, "an account of that name is being made",
+  order.reservation = Reserve(order.computer);
+  if (!order.reservation) {
+    return FailureAnswer(409, kAlreadyUnderWay, "an account of that name is being made or removed",
                          kRetryUnderWaySeconds);
   }
   return std::nullopt;
@@ -77,8 +78,8 @@ WebAnswer AccountCreation::Carry(const Task& task, Order&& handedOver) {
   if (!order.tokenId.empty() && !tokens_.Claim(order.tokenId, order.hostName, now)) {
     return FailureAnswer(401, kLogonFailure, "the token has been used");
   }
-  const AccountRequest request = {order.computer, order.hostName, order.container, task.request.client.Text(),
-                                  order.tokenId};
+  const AccountRequest request = {order.computer, order.hostName, order.container,
+                                  task.request.client.Client().Text(), order.tokenId};
   const auto id =
       ledger_.Begin(request, now, now - kSecondsPerDay, task.configuration->access.accountsPerDay);
   if (!id) {
@@ -101,14 +102,13 @@ std::optional<WebAnswer> AccountCreation::CheckToken(const Task& task, Order& or
   return std::nullopt;
 }
 
-bool AccountCreation::Reserve(Order& order) {
+std::shared_ptr<void> AccountCreation::Reserve(const std::string& computer) {
   const std::lock_guard lock(mutex_);
-  if (!reserved_.insert(order.computer).second) return false;
-  order.reservation = std::shared_ptr<void>(nullptr, [this, computer = order.computer](void*) {
+  if (!reserved_.insert(computer).second) return nullptr;
+  return std::shared_ptr<void>(this, [this, computer](void*) {
     const std::lock_guard releaseLock(mutex_);
     reserved_.erase(computer);
   });
-  return true;
 }
 
 WebAnswer AccountCreation::CarryEntered(const Task& task, const Order& order, int64_t id) {

@@ -39,9 +39,12 @@ class AccountCreation {
   // outcome before this returns. Throws Failure and DatabaseError.
   WebAnswer Carry(const Task& task, Order&& handedOver);
 
+  // Keeps orders for the name of this computer away as long as the result exists; null when there is one.
+  // What else is done to an account is done under such a reservation.
+  std::shared_ptr<void> Reserve(const std::string& computer);
+
  private:
   std::optional<WebAnswer> CheckToken(const Task& task, Order& order);
-  bool Reserve(Order& order);
   WebAnswer CarryEntered(const Task& task, const Order& order, int64_t id);
 
   Ledger& ledger_;

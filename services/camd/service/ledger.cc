@@ -26,12 +26,20 @@ constexpr const char* kSchema = R"(
   CREATE INDEX IF NOT EXISTS accountsByClient ON accounts (client, requested);
 )";
 
-// An account that was taken over was first asked for when the entry of the same identifier was.
-constexpr const char* kColumns =
-    "SELECT id, computer, accountName, dn, sid, controller, passwordSet, lastLogon, logonCount, "
-    "(SELECT min(first.requested) FROM accounts AS first WHERE first.id = accounts.id "
-    "OR (first.sid <> '' AND first.sid = accounts.sid)) FROM accounts WHERE state IN ('given', "
-    "'interrupted') ";
+// An account that was taken over was first asked for when the entry of the same identifier was, or the one
+// whose outcome nobody learnt. That one says nothing of an account that another entry knows.
+constexpr const char* kColumns = R"(
+  SELECT id, computer, accountName, dn, sid, controller, passwordSet, lastLogon, logonCount,
+    (SELECT min(first.requested) FROM accounts AS first
+      WHERE first.id = accounts.id
+        OR (accounts.sid <> '' AND first.sid = accounts.sid)
+        OR (accounts.sid <> '' AND first.computer = accounts.computer AND first.state = 'interrupted'))
+  FROM accounts
+  WHERE (state = 'given'
+      OR (state = 'interrupted'
+        AND NOT EXISTS (SELECT 1 FROM accounts AS known
+          WHERE known.computer = accounts.computer AND known.sid <> '' AND known.state IN ('given', 'kept'))))
+)";
 
 LedgerEntry EntryOf(const Statement& row) {
   LedgerEntry entry;

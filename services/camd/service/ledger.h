@@ -28,7 +28,7 @@ struct AccountRequest {
   std::string computer;
   std::string hostName;
   std::string container;
-  std::string client;
+  std::string client;  // an address, or an IPv6 client's network: who shares a quota
   std::string tokenId;
 };
 
@@ -58,7 +58,8 @@ class Ledger {
   void Interrupt(int64_t id, int64_t now);
 
   // The latest account of this name that the service gave out, or may have made, and that was neither removed
-  // nor seen in use.
+  // nor seen in use. A request whose outcome is unknown does not count beside an account of the name that is
+  // known, since that one may be in use.
   std::optional<LedgerEntry> FindLatest(const std::string& computer);
   // All such accounts that were asked for before a time.
   std::vector<LedgerEntry> FindOlderThan(int64_t time);

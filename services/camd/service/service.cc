@@ -85,7 +85,7 @@ class Service {
     WebServer server(started_, ReadPublicFile(started_.certificateFile), ReadCredentialFile(started_.keyFile),
                      handler);
     const Repetition removal(kTimeBetweenRemovals, [this] {
-      RemoveUnusedAccounts(Current()->directory, ledger_, directory_, audit_);
+      RemoveUnusedAccounts(Current()->directory, ledger_, directory_, creation_, audit_);
     });
     syslog(LOG_INFO, "serving %s port %u", started_.listenAddress.c_str(), started_.port);
     for (int signal = 0; sigwait(&signals, &signal) == 0 && signal == SIGHUP;) Reload(handler);

@@ -14,7 +14,13 @@ void Note(AuditLog& audit, const LedgerEntry& entry, const char* outcome, const 
       {{"event", "unused account"}, {"computer", entry.computer}, {"outcome", outcome}, {"text", text}});
 }
 
-// False when the directory does not answer, so that there is no use in going on.
+// Whether a failure would meet the next account too.
+bool IsOfTheWholeDirectory(uint32_t status) {
+  return status == kNoLogonServers || status == kTimeout || status == kServiceLogonFailed ||
+         status == kTimeSkew;
+}
+
+// False when there is no use in going on.
 bool RemoveOne(const DirectorySettings& settings, const LedgerEntry& entry, Ledger& ledger,
                DirectoryClient& directory, AuditLog& audit) {
   try {
@@ -28,7 +34,7 @@ bool RemoveOne(const DirectorySettings& settings, const LedgerEntry& entry, Ledg
       ledger.MarkKept(entry.id, time(nullptr));
     } else {
       Note(audit, entry, "not looked at", failure.what());
-      return failure.Code() == kAccessDenied;
+      return !IsOfTheWholeDirectory(failure.Code());
     }
     Note(audit, entry, "kept", failure.what());
   }
@@ -38,11 +44,16 @@ bool RemoveOne(const DirectorySettings& settings, const LedgerEntry& entry, Ledg
 }  // namespace
 
 void RemoveUnusedAccounts(const DirectorySettings& settings, Ledger& ledger, DirectoryClient& directory,
-                          AuditLog& audit) {
+                          AccountCreation& creation, AuditLog& audit) {
   if (settings.removeUnusedAfter.count() == 0) return;
   try {
     const int64_t age = std::chrono::seconds(settings.removeUnusedAfter).count();
     for (const LedgerEntry& entry : ledger.FindOlderThan(time(nullptr) - age)) {
+      const auto reservation = creation.Reserve(entry.computer);
+      if (!reservation) continue;
+      // Since the list was read the name may have been given out anew.
+      const auto latest = ledger.FindLatest(entry.computer);
+      if (!latest || latest->id != entry.id) continue;
       if (!RemoveOne(settings, entry, ledger, directory, audit)) return;
     }
   } catch (const DatabaseError& error) {
