@@ -1,5 +1,6 @@
 """Who may ask, and for what."""
 import sqlite3
+import subprocess
 import time
 
 from camd import ServiceTest
@@ -82,6 +83,22 @@ class QuotaTest(ServiceTest):
         self.service.create("host2.corp.example")
         self.service.change_ledger("UPDATE accounts SET requested = requested - 86401")
         self.assertEqual(self.service.create("host3.corp.example").code, 201)
+
+
+class NetworkQuotaTest(ServiceTest):
+    """IPv6 gives a host more addresses than anybody can count."""
+
+    CHANGES = {"server": {"listen-address": "::"}, "access": {"accounts-per-day": 1, "client-addresses": ["::/0"]}}
+
+    def setUp(self):
+        for address in ("2001:db8:1::1", "2001:db8:1::2", "2001:db8:2::1"):
+            subprocess.run(["ip", "address", "add", f"{address}/128", "dev", "lo", "nodad"], check=True)
+        super().setUp()
+
+    def testAddressesOfANetworkShareItsQuota(self):
+        answers = [self.service.create(f"host{number}.corp.example", source=source, address=source)
+                   for number, source in enumerate(("2001:db8:1::1", "2001:db8:1::2", "2001:db8:2::1"))]
+        self.assertEqual([answer.code for answer in answers], [201, 429, 201])
 
 
 class TokenTest(ServiceTest):

@@ -138,9 +138,10 @@ class Service:
         temporary.write_text(json.dumps(behaviour), encoding="utf-8")
         temporary.rename(self.folder / "behaviour")
 
-    def start(self):
+    def start(self, **variables):
+        """Starts the service; `variables` are added to its environment."""
         environment = {"PATH": "/usr/bin:/bin", "ASAN_OPTIONS": "quarantine_size_mb=1",
-                       "TSAN_OPTIONS": os.environ.get("TSAN_OPTIONS", "")}
+                       "TSAN_OPTIONS": os.environ.get("TSAN_OPTIONS", "")} | variables
         self.process = subprocess.Popen([SERVICE, "--config", self.configuration], env=environment,
                                         stdin=subprocess.DEVNULL, stderr=subprocess.PIPE, text=True)
         while True:
@@ -181,8 +182,8 @@ class Service:
         assert done.returncode == 0, done.stderr
         return done.stdout.strip()
 
-    def ask(self, method, path, body=None, source="127.0.0.1", token=None):
-        connection = http.client.HTTPSConnection("127.0.0.1", PORT, timeout=40, context=tls(),
+    def ask(self, method, path, body=None, source="127.0.0.1", token=None, address="127.0.0.1"):
+        connection = http.client.HTTPSConnection(address, PORT, timeout=40, context=tls(),
                                                  source_address=(source, 0))
         headers = {} if token is None else {"Authorization": f"Bearer {token}"}
         connection.request(method, path, body, headers)

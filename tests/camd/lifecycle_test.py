@@ -1,5 +1,7 @@
 """Starting, reloading and stopping the service, and what it remembers."""
 import signal
+import socket
+import subprocess
 import unittest
 
 from camd import PORT, Service, ServiceTest, connect, status_of_next, wait_until
@@ -39,6 +41,52 @@ class StopTest(ServiceTest):
             return True
         except OSError:
             return False
+
+
+class LongStopTest(ServiceTest):
+    """Requests wait for a helper that answers none."""
+
+    CHANGES = {"server": {"helpers": 1}, "directory": {"helper-timeout-seconds": 2}}
+
+    def testRequestThatWouldHoldUpTheEndIsToldToComeAgain(self):
+        self.service.behave(silent=True)
+        creations = [self.service.later(self.service.create, f"host{number}.corp.example") for number in range(8)]
+        # The first two are with the directory then, one after the other, and all others wait.
+        wait_until(lambda: len(self.service.helper_requests()) == 2)
+        self.service.process.send_signal(signal.SIGTERM)
+        outcomes = [creation.result().outcome for creation in creations]
+        self.assertEqual(self.service.wait(), 0)
+        self.assertEqual(set(outcomes), {(504, 1460), (503, 170)})
+        self.assertLess(outcomes.count((504, 1460)), 6)
+
+
+class SystemManagerTest(unittest.TestCase):
+    """systemd is told when the service answers, and when it ends."""
+
+    def setUp(self):
+        self.service = Service()
+        self.addCleanup(self.service.close)
+
+    def assert_told(self, place):
+        manager = socket.socket(socket.AF_UNIX, socket.SOCK_DGRAM)
+        self.addCleanup(manager.close)
+        manager.settimeout(20)
+        manager.bind(place.replace("@", "\0") if place.startswith("@") else place)
+        self.service.start(NOTIFY_SOCKET=place)
+        self.assertEqual(manager.recv(4096), b"READY=1")
+        self.assertEqual(self.service.domain().code, 200)
+        self.assertEqual(self.service.stop(), 0)
+        self.assertEqual(manager.recv(4096), b"STOPPING=1")
+
+    def testSocketInTheFileSystemIsTold(self):
+        self.assert_told(str(self.service.folder / "manager"))
+
+    def testSocketWithoutAFileIsTold(self):
+        self.assert_told("@velmor-camd-test")
+
+    def testSocketThatIsNotThereKeepsNobodyFromWorking(self):
+        self.service.start(NOTIFY_SOCKET=str(self.service.folder / "absent"))
+        self.assertEqual(self.service.domain().code, 200)
 
 
 class LedgerTest(ServiceTest):
@@ -112,6 +160,25 @@ class UnusedAccountTest(ServiceTest):
         wait_until(lambda: self.service.helper_requests("remove-unused"))
         wait_until(lambda: any(event.get("outcome") == "not looked at" for event in self.service.audit()))
         self.assertEqual(self.service.ledger(), [("HOST2", "given")])
+
+    def testAccountThatCannotBeLookedAtDoesNotKeepOthersFromIt(self):
+        self.service.create("host1.corp.example")
+        self.service.create("host2.corp.example")
+        self.service.behave(only="HOST1", status=1359)
+        self.restart_later(3)
+        wait_until(lambda: self.service.ledger() == [("HOST1", "given"), ("HOST2", "removed")])
+
+    def testNameIsNotGivenOutWhileItsAccountIsRemoved(self):
+        self.service.create()
+        self.service.behave(**{"wait-for": "go"})
+        self.restart_later(3)
+        wait_until(lambda: self.service.helper_requests("remove-unused"))
+        creation = self.service.later(self.service.create)
+        wait_until(lambda: creation.done() or len(self.service.helper_requests("create")) == 2)
+        self.service.write("go", "")
+        self.assertEqual(creation.result().outcome, (409, 1061))
+        wait_until(lambda: self.service.ledger() == [("HOST2", "removed")])
+        self.assertEqual(self.service.create().code, 201)
 
     def testRemovalIsInTheAuditLog(self):
         self.service.create()
@@ -217,6 +284,17 @@ class ConfigurationTest(unittest.TestCase):
                 self.service.configure(**{section: {key: value}})
                 self.assert_refused(rf"camd\.conf:\d+: ")
 
+    def testValueThatMeansNothingIsNamedWithItsLine(self):
+        for section, key, value in (("server", "listen-address", "everywhere"), ("server", "ledger-file", ""),
+                                    ("server", "ledger-file", ":memory:"), ("server", "ledger-file", "ledger.db"),
+                                    ("server", "audit-file", "audit.log"), ("directory", "domain", "corp example"),
+                                    ("directory", "controller", "dc1/x"), ("directory", "user", "CORP\\camsvc"),
+                                    ("directory", "user", "camsvc@corp.example"), ("directory", "helper", ""),
+                                    ("directory", "helper", "velmor-camd-helper")):
+            with self.subTest(key=key, value=value):
+                self.service.configure(**{section: {key: value}})
+                self.assert_refused(r"camd\.conf:\d+: ")
+
     def testMissingKeyIsNamed(self):
         text = self.service.read("camd.conf").replace('user = "camsvc"\n', "")
         self.service.write("camd.conf", text)
@@ -238,11 +316,14 @@ class ConfigurationTest(unittest.TestCase):
         self.service.configure(directory={"password-file": "camd-password"})
         self.assert_refused("handed over no credential 'camd-password'")
 
-    def testCertificateThatIsNoneIsRefusedAtTheStart(self):
+    def testCertificateThatIsNoneIsRefused(self):
         self.service.write("camd.pem", "no certificate\n")
-        done = self.service.command()
-        self.assertEqual(done.returncode, 1)
-        self.assertIn(f"port {PORT}", done.stderr)
+        self.assert_refused("the certificate and its key cannot be used: ")
+
+    def testKeyOfAnotherCertificateIsRefused(self):
+        subprocess.run(["openssl", "ecparam", "-name", "prime256v1", "-genkey", "-noout", "-out",
+                        self.service.folder / "camd.key"], check=True, capture_output=True)
+        self.assert_refused("the certificate and its key cannot be used: ")
 
     def testPortThatIsTakenIsReported(self):
         self.service.start()

@@ -2,6 +2,7 @@
 import os
 import socket
 import ssl
+import subprocess
 import threading
 import time
 
@@ -123,6 +124,13 @@ class ServerTest(ServiceTest):
             connection.sendall(b"\x16\x03\x01\x02\x00\x01\x00\x01\xfc\x03\x03")
             self.assertTrue(is_closed(connection))
 
+    def testNewNegotiationIsNotForTheClientToAskFor(self):
+        """Each would cost the service far more than the client."""
+        asked = subprocess.run(["openssl", "s_client", "-connect", f"127.0.0.1:{PORT}", "-tls1_2"], input="R\n" * 20,
+                               capture_output=True, text=True, check=False, timeout=60)
+        self.assertLessEqual(asked.stderr.count("RENEGOTIATING"), 1, asked.stderr)
+        self.assert_serving()
+
     def testConnectionWithoutRequestIsCutOff(self):
         with connect() as connection:
             self.assertTrue(is_closed(connection))
@@ -188,6 +196,27 @@ class CrowdTest(ServiceTest):
         for _ in range(5):
             self.ask_all_at_once()
         self.assertLess(self.service.memory() - before, 8 * 1024)
+
+    def testMemoryStaysFlatUnderThoseWhoDoNotBehave(self):
+        self.service.domain()
+        for _ in range(2):
+            self.misbehave_all_at_once()
+        before = self.service.memory()
+        for _ in range(5):
+            self.misbehave_all_at_once()
+        self.assertLess(self.service.memory() - before, 8 * 1024)
+        self.assertEqual(self.service.domain().code, 200)
+
+    def misbehave_all_at_once(self):
+        """Half of the crowd stops in the handshake, and half in a request; then all go away."""
+        crowd = [socket.create_connection(("127.0.0.1", PORT), timeout=20) for _ in range(self.COUNT // 2)]
+        for connection in crowd:
+            connection.sendall(b"\x16\x03\x01\x02\x00\x01\x00\x01\xfc\x03\x03")
+        crowd += [connect() for _ in range(self.COUNT // 2)]
+        for connection in crowd[self.COUNT // 2:]:
+            connection.sendall(b"POST /v1/computers HTTP/1.1\r\nContent-Length: 8000\r\n\r\n" + b"x" * 7000)
+        for connection in crowd:
+            connection.close()
 
     def testDescriptorsAreGivenBack(self):
         self.service.domain()

@@ -29,6 +29,14 @@ class Section {
     if (value.empty()) throw ConfigurationError(path_ + ": " + Named(key) + " is missing");
   }
 
+  // Refuses a text that was given and that `faultOf` finds a fault with; an empty one is none.
+  template <typename Check>
+  void Require(const char* key, const std::string& value, Check faultOf) {
+    const toml::node* node = Find(key);
+    const std::string fault = node == nullptr ? std::string() : faultOf(value);
+    if (!fault.empty()) Refuse(*node, fault);
+  }
+
   template <typename Number>
   void TakeNumber(const char* key, Number& value, int64_t smallest, int64_t largest) {
     if (const toml::node* node = Find(key)) {
@@ -120,14 +128,43 @@ class Section {
   std::set<std::string> taken_;
 };
 
+std::string FaultOfListenAddress(const std::string& text) {
+  return Address::Parse(text) ? "" : "\"" + text + "\" is no address to listen at";
+}
+
+std::string FaultOfDomain(const std::string& text) {
+  return IsHostName(text) ? "" : "\"" + text + "\" is no domain's DNS name";
+}
+
+std::string FaultOfController(const std::string& text) {
+  return text.empty() || IsHostName(text) ? "" : "\"" + text + "\" is no controller's DNS name";
+}
+
+std::string FaultOfUser(const std::string& text) {
+  const bool plain = text.find_first_of("@\\/") == std::string::npos;
+  return plain ? "" : "the user \"" + text + "\" must be named without its domain";
+}
+
+std::string FaultOfPath(const std::string& text) {
+  return text.starts_with('/') ? "" : "\"" + text + "\" is no whole path, which begins with \"/\"";
+}
+
+// An empty text stands for no file.
+std::string FaultOfPathIfAny(const std::string& text) {
+  return text.empty() ? "" : FaultOfPath(text);
+}
+
 void TakeServer(Section section, Configuration& result) {
   ServerSettings& server = result.server;
   section.Take("listen-address", server.listenAddress);
+  section.Require("listen-address", server.listenAddress, FaultOfListenAddress);
   section.TakeNumber("port", server.port, 1, 65535);
   section.TakeRequired("certificate-file", server.certificateFile);
   section.TakeRequired("key-file", server.keyFile);
   section.Take("ledger-file", server.ledgerFile);
+  section.Require("ledger-file", server.ledgerFile, FaultOfPath);
   section.Take("audit-file", result.auditFile);
+  section.Require("audit-file", result.auditFile, FaultOfPathIfAny);
   section.TakeNumber("connections", server.connections, 1, 100000);
   section.TakeNumber("connections-per-client", server.connectionsPerClient, 0, 100000);
   section.TakeDuration("request-timeout-seconds", server.requestTimeout, 1, 600);
@@ -138,8 +175,11 @@ void TakeServer(Section section, Configuration& result) {
 
 void TakeDirectory(Section section, DirectorySettings& directory) {
   section.TakeRequired("domain", directory.domain);
+  section.Require("domain", directory.domain, FaultOfDomain);
   section.Take("controller", directory.controller);
+  section.Require("controller", directory.controller, FaultOfController);
   section.TakeRequired("user", directory.user);
+  section.Require("user", directory.user, FaultOfUser);
   section.TakeRequired("password-file", directory.passwordFile);
   section.Take("default-container", directory.defaultContainer);
   section.TakeChoice<ExistingAccounts>("existing-accounts", directory.existingAccounts,
@@ -148,6 +188,7 @@ void TakeDirectory(Section section, DirectorySettings& directory) {
                                         {"any", ExistingAccounts::kAny}});
   section.TakeDuration("remove-unused-after-hours", directory.removeUnusedAfter, 0, 24 * 365);
   section.Take("helper", directory.helper);
+  section.Require("helper", directory.helper, FaultOfPath);
   section.TakeDuration("helper-timeout-seconds", directory.helperTimeout, 1, 600);
   section.CheckNothingLeft();
 }
@@ -180,25 +221,6 @@ void CheckSections(const std::string& path, const toml::table& whole) {
   }
 }
 
-// What no single key shows to be wrong.
-void CheckValues(const std::string& path, const Configuration& configuration) {
-  const auto refuse = [&path](const std::string& fault) { throw ConfigurationError(path + ": " + fault); };
-  if (!Address::Parse(configuration.server.listenAddress)) {
-    refuse("\"" + configuration.server.listenAddress + "\" is no address to listen at");
-  }
-  if (!IsHostName(configuration.directory.domain)) {
-    refuse("\"" + configuration.directory.domain + "\" is no domain's DNS name");
-  }
-  const std::string& controller = configuration.directory.controller;
-  if (!controller.empty() && !IsHostName(controller))
-    refuse("\"" + controller + "\" is no controller's DNS name");
-  const std::string& user = configuration.directory.user;
-  if (user.find_first_of("@\\/") != std::string::npos) {
-    refuse("the user \"" + user + "\" must be named without its domain");
-  }
-  if (configuration.directory.helper.front() != '/') refuse("the helper must be named with its whole path");
-}
-
 toml::table Parse(const std::string& path) {
   try {
     return toml::parse_file(path);
@@ -219,7 +241,6 @@ Configuration ReadConfiguration(const std::string& path) {
   TakeServer(Section(path, whole, "server"), configuration);
   TakeDirectory(Section(path, whole, "directory"), configuration.directory);
   TakeAccess(Section(path, whole, "access"), configuration.access);
-  CheckValues(path, configuration);
   return configuration;
 }
 

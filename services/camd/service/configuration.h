@@ -46,7 +46,7 @@ struct DirectorySettings {
   ExistingAccounts existingAccounts = ExistingAccounts::kRefuse;
   std::chrono::hours removeUnusedAfter{0};
   std::string helper = "/usr/libexec/velmor/velmor-camd-helper";
-  std::chrono::seconds helperTimeout{60};
+  std::chrono::seconds helperTimeout{45};
 };
 
 struct AccessSettings {

@@ -38,6 +38,10 @@ WebAnswer AnswerWith(const DomainInformation& information) {
   return {200, Secret(body.dump()), 0};
 }
 
+WebAnswer StoppingAnswer() {
+  return FailureAnswer(503, kBusy, "the service is being stopped", kRetryWhenBusySeconds);
+}
+
 }  // namespace
 
 void RequestHandler::Configure(std::shared_ptr<const Configuration> configuration) {
@@ -47,7 +51,7 @@ void RequestHandler::Configure(std::shared_ptr<const Configuration> configuratio
 
 void RequestHandler::RefuseFurther() {
   const std::lock_guard lock(mutex_);
-  refusing_ = true;
+  refusing_ = std::chrono::steady_clock::now();
 }
 
 void RequestHandler::Handle(WebRequest request, Completion completion) {
@@ -61,11 +65,9 @@ void RequestHandler::Handle(WebRequest request, Completion completion) {
   {
     const std::lock_guard lock(mutex_);
     task->configuration = configuration_;
-    refusing = refusing_;
+    refusing = refusing_.has_value();
   }
-  if (refusing) {
-    return Finish(*task, FailureAnswer(503, kBusy, "the service is being stopped", kRetryWhenBusySeconds));
-  }
+  if (refusing) return Finish(*task, StoppingAnswer());
   if (auto refusal = Refusal(task->request, task->configuration->access))
     return Finish(*task, std::move(*refusal));
   Route(task);
@@ -120,9 +122,19 @@ void RequestHandler::HandleCreation(const std::shared_ptr<Task>& task) {
 }
 
 void RequestHandler::Enqueue(const std::shared_ptr<Task>& task, std::function<WebAnswer()> work) {
-  const bool taken = queue_.TryAdd([this, task, work = std::move(work)] { FinishWith(*task, work); });
+  const bool taken = queue_.TryAdd([this, task, work = std::move(work)] {
+    if (IsTooLate(*task)) return Finish(*task, StoppingAnswer());
+    FinishWith(*task, work);
+  });
   if (!taken)
     Finish(*task, FailureAnswer(503, kBusy, "too many requests are waiting", kRetryWhenBusySeconds));
+}
+
+// Whether the service is being stopped and has gone on for so long that no further work may begin.
+bool RequestHandler::IsTooLate(const Task& task) {
+  const std::lock_guard lock(mutex_);
+  return refusing_ &&
+         std::chrono::steady_clock::now() > *refusing_ + task.configuration->directory.helperTimeout;
 }
 
 void RequestHandler::FinishWith(Task& task, const std::function<WebAnswer()>& work) {

@@ -2,6 +2,7 @@
 #ifndef CAMD_SERVICE_REQUEST_HANDLER_H
 #define CAMD_SERVICE_REQUEST_HANDLER_H
 
+#include <chrono>
 #include <functional>
 #include <memory>
 #include <mutex>
@@ -31,7 +32,8 @@ class RequestHandler {
   // Takes effect for requests that begin from now on. Must have been called before the first request.
   void Configure(std::shared_ptr<const Configuration> configuration);
 
-  // Refuses every further request, so that the ones under way can be waited for.
+  // Refuses every further request, so that the ones under way can be waited for. One whose turn comes later
+  // than after the time that one request may take is told to come again.
   void RefuseFurther();
 
   // Answers a request: calls `completion` once, on this thread before the return or on another one later.
@@ -48,6 +50,7 @@ class RequestHandler {
   void HandleCreation(const std::shared_ptr<Task>& task);
   void Enqueue(const std::shared_ptr<Task>& task, std::function<WebAnswer()> work);
   void FinishWith(Task& task, const std::function<WebAnswer()>& work);
+  bool IsTooLate(const Task& task);
   void Finish(Task& task, WebAnswer answer);
 
   AccountCreation& creation_;
@@ -57,7 +60,8 @@ class RequestHandler {
   RateLimit rateLimit_;
   std::mutex mutex_;
   std::shared_ptr<const Configuration> configuration_;
-  bool refusing_ = false;
+  // Since when further requests are refused.
+  std::optional<std::chrono::steady_clock::time_point> refusing_;
 };
 
 }  // namespace camd

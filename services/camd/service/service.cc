@@ -15,6 +15,7 @@
 #include "service/credential_file.h"
 #include "service/domain_cache.h"
 #include "service/request_handler.h"
+#include "service/system_manager.h"
 #include "service/unused_accounts.h"
 #include "service/web_server.h"
 
@@ -88,8 +89,10 @@ class Service {
       RemoveUnusedAccounts(Current()->directory, ledger_, directory_, creation_, audit_);
     });
     syslog(LOG_INFO, "serving %s port %u", started_.listenAddress.c_str(), started_.port);
+    TellReady();
     for (int signal = 0; sigwait(&signals, &signal) == 0 && signal == SIGHUP;) Reload(handler);
     syslog(LOG_INFO, "stopping; requests under way are finished");
+    TellStopping();
     handler.RefuseFurther();
     server.Stop();
   }
@@ -147,8 +150,8 @@ void Serve(const std::string& path) {
 void Check(const std::string& path) {
   const Configuration configuration = ReadConfiguration(path);
   ReadCredentialFile(configuration.directory.passwordFile);
-  ReadPublicFile(configuration.server.certificateFile);
-  ReadCredentialFile(configuration.server.keyFile);
+  CheckPair(ReadPublicFile(configuration.server.certificateFile),
+            ReadCredentialFile(configuration.server.keyFile));
 }
 
 }  // namespace camd

@@ -1,6 +1,7 @@
 #include "service/web_server.h"
 
 #include <arpa/inet.h>
+#include <gnutls/gnutls.h>
 #include <microhttpd.h>
 #include <netinet/in.h>
 #include <sys/socket.h>
@@ -13,6 +14,7 @@
 #include <charconv>
 #include <cstdarg>
 #include <cstring>
+#include <memory>
 #include <string_view>
 
 #include "common/status.h"
@@ -76,6 +78,18 @@ uint64_t AnnouncedLength(MHD_Connection* connection) {
   return length;
 }
 
+gnutls_datum_t DatumOf(const Secret& text) {
+  // The library does not change what it is given to read.
+  auto* bytes = reinterpret_cast<unsigned char*>(const_cast<char*>(text.Text()));
+  return {bytes, static_cast<unsigned int>(text.Size())};
+}
+
+struct CredentialsRelease {
+  void operator()(gnutls_certificate_credentials_t credentials) const {
+    gnutls_certificate_free_credentials(credentials);
+  }
+};
+
 void AddHeaders(MHD_Response* response, const WebAnswer& answer) {
   MHD_add_response_header(response, MHD_HTTP_HEADER_CONTENT_TYPE, "application/json");
   MHD_add_response_header(response, MHD_HTTP_HEADER_CACHE_CONTROL, "no-store");
@@ -111,6 +125,22 @@ __attribute__((format(printf, 2, 0))) void LogMessage(void* /*closure*/, const c
 }
 
 }  // namespace
+
+void CheckPair(const Secret& certificate, const Secret& key) {
+  gnutls_certificate_credentials_t credentials = nullptr;
+  int error = gnutls_certificate_allocate_credentials(&credentials);
+  const std::unique_ptr<std::remove_pointer_t<gnutls_certificate_credentials_t>, CredentialsRelease> owner(
+      credentials);
+  const gnutls_datum_t pem = DatumOf(certificate);
+  const gnutls_datum_t keyPem = DatumOf(key);
+  if (error == GNUTLS_E_SUCCESS) {
+    error = gnutls_certificate_set_x509_key_mem(credentials, &pem, &keyPem, GNUTLS_X509_FMT_PEM);
+  }
+  if (error < 0) {
+    throw WebServerError(std::string("the certificate and its key cannot be used: ") +
+                         gnutls_strerror(error));
+  }
+}
 
 // A request while the web server has it.
 struct WebServer::Exchange {
@@ -166,6 +196,7 @@ struct WebServer::Callbacks {
 WebServer::WebServer(const ServerSettings& settings, const Secret& certificate, const Secret& key,
                      RequestHandler& handler)
     : handler_(handler), watch_(settings.requestTimeout) {
+  CheckPair(certificate, key);
   const SocketAddress address(settings.listenAddress, settings.port);
   const unsigned int flags = MHD_USE_EPOLL_INTERNAL_THREAD | MHD_USE_TLS | MHD_ALLOW_SUSPEND_RESUME |
                              MHD_USE_ITC | MHD_USE_ERROR_LOG | (address.isV6 ? MHD_USE_DUAL_STACK : 0);
@@ -188,8 +219,7 @@ WebServer::WebServer(const ServerSettings& settings, const Secret& certificate, 
                              MHD_OPTION_END);
   if (daemon_ == nullptr) {
     throw WebServerError("cannot serve " + settings.listenAddress + " port " + std::to_string(settings.port) +
-                         ": " +
-                         (errno != 0 ? ErrorText(errno) : "the certificate and its key cannot be used"));
+                         ": " + (errno != 0 ? ErrorText(errno) : "the web server does not start"));
   }
 }
 

@@ -16,11 +16,14 @@ struct MHD_Daemon;
 
 namespace camd {
 
-// A server that cannot be started; the text says why.
+// A server that cannot be started, or a certificate that none can use; the text says why.
 class WebServerError : public std::runtime_error {
  public:
   using std::runtime_error::runtime_error;
 };
+
+// Throws WebServerError unless `certificate` and `key` are PEM and belong together.
+void CheckPair(const Secret& certificate, const Secret& key);
 
 // Serves HTTP/1.1 over TLS 1.2 or newer on threads of its own, none of which waits for a client or for the
 // directory.
