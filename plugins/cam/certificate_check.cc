@@ -32,11 +32,16 @@ void CertificateCheck::ThrowIfRefused() const {
   if (!difference_.empty()) throw Failure(WRONG_CERTIFICATE, difference_);
 }
 
+void CertificateCheck::ThrowUnlessAccepted() const {
+  if (!accepted_) throw Failure(WRONG_CERTIFICATE, "it showed no certificate");
+}
+
 int CertificateCheck::Verify(X509_STORE_CTX* handshake, void* self) {
   auto& check = *static_cast<CertificateCheck*>(self);
   try {
     const X509* certificate = X509_STORE_CTX_get0_cert(handshake);
     if (certificate != nullptr && check.Accepts(*certificate)) {
+      check.accepted_ = true;
       check.WarnOfDate(*certificate);
       X509_STORE_CTX_set_error(handshake, X509_V_OK);
       return 1;

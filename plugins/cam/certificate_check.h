@@ -28,6 +28,10 @@ class CertificateCheck {
   /// not be looked at.
   void ThrowIfRefused() const;
 
+  /// Throws Failure for WRONG_CERTIFICATE unless a certificate was accepted. For a handshake that succeeded:
+  /// one without certificates, should the machine's settings of OpenSSL allow that, calls nobody to compare.
+  void ThrowUnlessAccepted() const;
+
  private:
   static int Verify(X509_STORE_CTX* handshake, void* self);
 
@@ -39,6 +43,7 @@ class CertificateCheck {
   std::optional<Sha256> sha256_;
   std::string difference_;
   bool outOfMemory_ = false;
+  bool accepted_ = false;
 };
 
 }  // namespace camproxy

@@ -137,6 +137,7 @@ class Connection {
         Await([&](auto done) { stream_.async_handshake(asio::ssl::stream_base::client, std::move(done)); });
     if (check_ != nullptr) check_->ThrowIfRefused();
     ThrowIfFailed("TLS handshake", error);
+    if (check_ != nullptr) check_->ThrowUnlessAccepted();
   }
 
   void Send(const SecretString& bytes) {

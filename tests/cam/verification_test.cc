@@ -4,12 +4,14 @@
 #include <sys/socket.h>
 #include <unistd.h>
 
+#include <cstdlib>
 #include <memory>
 #include <string>
 #include <vector>
 
 #include "cam/plugin.h"
 #include "cam/tls_server.h"
+#include "support/files.h"
 #include "support/log_recorder.h"
 
 namespace camtest {
@@ -150,6 +152,29 @@ TEST(CamVerificationTest, CertificateBeforeItsDateIsAcceptedWithAWarning) {
 TEST(CamVerificationTest, NothingIsCheckedWithVerificationOff) {
   EXPECT_EQ(CreateAt(ExpiredIdentity(), "", Pin(Identity().Sha256())), ACCEPTED);
   EXPECT_EQ(RecordedLog(), std::vector<LogLine>{});
+}
+
+/// Lets every program of the sandbox speak TLS without certificates, and nothing else.
+void AllowTlsWithoutCertificates() {
+  testsupport::WriteFile(
+      "/etc/openssl-anonymous.cnf",
+      "openssl_conf = settings\n[settings]\nssl_conf = tls\n[tls]\nsystem_default = everybody\n"
+      "[everybody]\nCipherString = aNULL:@SECLEVEL=0\nMaxProtocol = TLSv1.2\n");
+  setenv("OPENSSL_CONF", "/etc/openssl-anonymous.cnf", 1);
+}
+
+TEST(CamVerificationTest, ServerWithoutACertificateGetsNothing) {
+  AllowTlsWithoutCertificates();
+  const Identity identity;
+  EXPECT_EQ(CreateAt(identity, identity.Sha1(), "", TLS1_2_VERSION), REFUSED_BEFORE_ANYTHING_WAS_SENT);
+  EXPECT_EQ(RecordedLog(),
+            (std::vector<LogLine>{{LOG_ERR, "CAM server 127.0.0.1: it showed no certificate"}}));
+}
+
+/// The server of the test above does answer those who want no certificate.
+TEST(CamVerificationTest, ServerWithoutACertificateIsReal) {
+  AllowTlsWithoutCertificates();
+  EXPECT_EQ(CreateAt(Identity(), "", "", TLS1_2_VERSION), ACCEPTED);
 }
 
 TEST(CamVerificationTest, Tls12IsSpoken) {
