@@ -2,8 +2,9 @@
 
 #include <syslog.h>
 
+#include <array>
+#include <cerrno>
 #include <fstream>
-#include <iterator>
 #include <utility>
 
 #include "authentication/active_directory_config_store.h"
@@ -11,6 +12,7 @@
 #include "authentication/configuration.h"
 #include "authentication/library_exceptions.h"
 #include "authentication/provider_exceptions.h"
+#include "errors/system_text.h"
 #include "errors/wiped_text.h"
 #include "hostmgmt/ip_config.h"
 #include "providers/active_directory_provider.h"
@@ -54,6 +56,19 @@ std::string StoredThumbprint() {
   }
 }
 
+/// A folder can be opened, but not be read.
+std::string ReadWholeFile(const std::string& path) {
+  std::ifstream file(path, std::ios_base::binary);
+  if (!file.is_open()) throw FileNotFoundException();
+  std::string text;
+  std::array<char, 4096> buffer{};
+  while (file.read(buffer.data(), buffer.size()) || file.gcount() > 0) {
+    text.append(buffer.data(), static_cast<std::size_t>(file.gcount()));
+  }
+  if (file.bad()) throw IOError("Unable to read '" + path + "': " + SystemText(errno));
+  return text;
+}
+
 CAM::DirectoryDomainInfo AskForDomain(const CAMProxy& proxy) {
   CAM::DirectoryDomainInfo domain;
   domain.netbiosDomainName = proxy.GetNetBIOSDomainName();
@@ -80,9 +95,7 @@ void ActiveDirectoryStore::ImportCertificateForCAM(const std::string& certificat
 }
 
 void ActiveDirectoryStore::ImportCertificateForCAM(const std::string& path, const std::string&) {
-  std::ifstream file(path, std::ios_base::binary);
-  if (!file.is_open()) throw FileNotFoundException();
-  ImportCertificateForCAM(std::string(std::istreambuf_iterator<char>(file), {}));
+  ImportCertificateForCAM(ReadWholeFile(path));
 }
 
 void ActiveDirectoryStore::JoinDomainWithCAM(const std::string& camServer, const std::string& container,

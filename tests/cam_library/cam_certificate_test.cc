@@ -131,6 +131,11 @@ TEST_F(CAMCertificateTest, FileThatCannotBeOpenedIsNotFound) {
                     "Exception 0x00000002: The system cannot find the file specified.");
 }
 
+TEST_F(CAMCertificateTest, FolderInsteadOfAFileIsAnIOError) {
+  EXPECT_THROW_WHAT(ActiveDirectoryStore(1).ImportCertificateForCAM("/etc", ""), IOError,
+                    "Unable to read '/etc': Is a directory");
+}
+
 TEST_F(CAMCertificateTest, FailingConfigurationStoreIsLoggedAndItsExceptionGoesOut) {
   const std::string pem = NewCertificate("rsa:2048");
   ActiveDirectoryStore store(1);

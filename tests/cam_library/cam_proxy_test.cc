@@ -182,6 +182,18 @@ TEST(CAMProxyTest, OtherStatusesAreUnknownAndCarryTheirCodeEvenWhenTheProviderMa
 }
 
 TEST(CAMProxyTest, PluginIsUnloadedWithTheProxy) {
+  InstallCamPlugin("scripted_cam");
+  const auto isMapped = [] {
+    return ReadFile("/proc/self/maps").find("libscripted_cam.so") != std::string::npos;
+  };
+  {
+    const CAMProxy proxy = OpenScripted();
+    EXPECT_TRUE(isMapped());
+  }
+  EXPECT_FALSE(isMapped());
+}
+
+TEST(CAMProxyTest, PluginThatIsRefusedIsUnloaded) {
   InstallCamPlugin("without_release");
   EXPECT_THROW(CAMProxy("without_release", "10.0.0.1", false, ""), InvalidCAMProxyProviderException);
   EXPECT_EQ(ReadFile("/proc/self/maps").find("libwithout_release.so"), std::string::npos);
