@@ -2,9 +2,13 @@
 // script.
 #include <gtest/gtest.h>
 #include <openssl/pem.h>
+#include <sys/socket.h>
+#include <unistd.h>
 
 #include <cctype>
+#include <chrono>
 #include <csignal>
+#include <thread>
 
 #include "cam/plugin.h"
 #include "cam/tls_server.h"
@@ -180,6 +184,29 @@ TEST_F(CamCommandTest, TrustOfAServerThatDoesNotAnswerGivesTheReason) {
   EXPECT_NE(outcome.errors.find("  reason:   Connection refused\n"), std::string::npos) << outcome.errors;
 }
 
+TEST_F(CamCommandTest, TrustOfAServerThatTricklesEndsInTime) {
+  std::uint16_t port = 0;
+  const int listener = camtest::ListenOnly(&port, 1);
+  std::thread server([listener] {
+    const int connection = accept4(listener, nullptr, nullptr, SOCK_CLOEXEC);
+    // The beginning of a long piece of a handshake, and then a byte of it now and then.
+    const std::string head("\x16\x03\x03\x40\x00\x02\x00\x3f\xfc", 9);
+    bool isThere = send(connection, head.data(), head.size(), MSG_NOSIGNAL) > 0;
+    for (int count = 0; isThere && count < 300; ++count) {
+      isThere = send(connection, "x", 1, MSG_NOSIGNAL) > 0;
+      std::this_thread::sleep_for(std::chrono::milliseconds(100));
+    }
+    close(connection);
+  });
+  UsePort(port);
+  const Outcome outcome = Trust();
+  EXPECT_EQ(outcome.exitCode, 12);
+  EXPECT_NE(outcome.errors.find("  reason:   no answer within 10 seconds\n"), std::string::npos)
+      << outcome.errors;
+  server.join();
+  close(listener);
+}
+
 TEST_F(CamCommandTest, ShowNeverPrintsTheToken) {
   camtest::WriteSettings(server_.Port(), "token = \"Zm9yIG9uZSBjcmVhdGlvbg\"\n");
   EXPECT_EQ(Shown()["token"], true);
@@ -311,8 +338,9 @@ TEST_P(CamStatusTest, OfTheServiceEndsWithTheCodeOfTheProxy) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Each, CamStatusTest,
-                         ::testing::Values(5U, 13U, 50U, 59U, 87U, 170U, 267U, 1061U, 1311U, 1326U, 1816U,
-                                           2224U, 10054U));
+                         ::testing::Values(5U, 13U, 31U, 50U, 59U, 87U, 170U, 267U, 1061U, 1067U, 1069U,
+                                           1210U, 1311U, 1326U, 1359U, 1398U, 1460U, 1816U, 2224U, 2691U,
+                                           10054U));
 
 }  // namespace
 

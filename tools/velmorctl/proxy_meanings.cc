@@ -5,6 +5,7 @@
 
 #include "authentication/exception.h"
 #include "authentication/library_exceptions.h"
+#include "authentication/provider_exceptions.h"
 
 namespace velmorctl {
 
@@ -17,6 +18,8 @@ constexpr char checkWay[] =
 constexpr char checkCertificate[] =
     "compare the service's fingerprints with \"velmorctl cam show\"; then \"velmorctl cam trust ADDRESS\"";
 constexpr char askOperator[] = "ask the service's administrator; its log says why";
+constexpr char checkName[] =
+    "give the host a name of at most 15 letters, digits and hyphens (hostnamectl set-hostname, /etc/hosts)";
 
 struct CodeRow {
   unsigned long code;
@@ -37,6 +40,7 @@ constexpr CodeRow codeRows[] = {
     {267, {ExitCode::Proxy, "give a --container that exists and that the service may write"}},
     {1061, {ExitCode::Proxy, "the account is being created: try again in a minute"}},
     {1064, {ExitCode::Proxy, "the system log names the fault in /etc/quenix/velmor/cam.conf"}},
+    {1210, {ExitCode::Proxy, checkName}},
     {1225, {ExitCode::Proxy, checkWay}},
     {1229, {ExitCode::Proxy, checkWay}},
     {1311, {ExitCode::Proxy, "no domain controller answers the service: ask its administrator"}},
@@ -57,6 +61,8 @@ static_assert(std::is_sorted(std::begin(codeRows), std::end(codeRows),
                                return left.code < right.code;
                              }));
 
+/// Of any other status that the plug-in or the service gives.
+constexpr Meaning otherStatus = {ExitCode::Proxy, askOperator};
 constexpr Meaning noPlugin = {ExitCode::Proxy,
                               "make /etc/quenix/velmor/camprovider.conf with the line: provider = \"cam\""};
 constexpr Meaning noPluginFile = {ExitCode::Proxy, "install the plug-in that camprovider.conf names"};
@@ -78,6 +84,9 @@ const Meaning& ProxyMeaningOf(const std::exception& exception) {
     if (row != std::end(codeRows)) {
       return row->meaning;
     }
+  }
+  if (Is<authentication::UnknownException>(exception)) {
+    return otherStatus;
   }
   if (Is<authentication::InvalidCAMProxyProviderException>(exception)) {
     return noPlugin;
