@@ -27,6 +27,7 @@ int main(int count, char** arguments) {
   server.new_task_queue = [threads] { return new httplib::ThreadPool(threads); };
   server.set_keep_alive_max_count(manyRequests);
   server.set_read_timeout(readSeconds);
+  server.set_tcp_nodelay(true);
   server.Get("/v1/domain", [](const httplib::Request&, httplib::Response& response) {
     response.set_content(domain, "application/json");
   });
