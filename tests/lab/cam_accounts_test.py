@@ -200,14 +200,14 @@ class CamUnknownOutcomeTest(CamAccountsTest):
     def testAccountThatSomebodyElseMadeMeanwhileIsKept(self):
         name = self.name("n1")
         service = self.interrupted(name)
-        self.directory.create_computer(name.upper(), f"{name}.corp.example")
+        self.directory.create_computer(name.upper(), f"{name}.corp.example", "OU=Hosts,OU=Servers")
         self.assertEqual(self.look_for_unused_ones(service), [(name.upper(), "kept")])
         self.assertIsNotNone(self.directory.computer(name.upper()))
 
     def testAccountThatSomebodyElseMadeMeanwhileIsNotTakenOver(self):
         name = self.name("n1")
         service = self.interrupted(name)
-        self.directory.create_computer(name.upper(), f"{name}.corp.example")
+        self.directory.create_computer(name.upper(), f"{name}.corp.example", "OU=Hosts,OU=Servers")
         self.assertEqual(self.outcome(service, name), (409, 2224))
 
     def testAccountThatTheNextRequestGaveOutIsKeptWhenItHasLoggedOn(self):

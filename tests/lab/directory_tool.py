@@ -53,8 +53,8 @@ def set_computer_dns_name(name, dns_name):
     directory.modify(change)
 
 
-def create_computer(name, dns_name):
-    directory.newcomputer(name)
+def create_computer(name, dns_name, unit=None):
+    directory.newcomputer(name, computerou=unit)
     set_computer_dns_name(name, dns_name)
 
 

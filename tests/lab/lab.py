@@ -179,8 +179,9 @@ class Directory:
     def set_computer_dns_name(self, name, dns_name):
         self._ask("set-computer-dns-name", name, dns_name)
 
-    def create_computer(self, name, dns_name):
-        self._ask("create-computer", name, dns_name)
+    def create_computer(self, name, dns_name, *unit):
+        """Makes an account; `unit` is where, without the domain's part, if not in the default place."""
+        self._ask("create-computer", name, dns_name, *unit)
 
     def bad_password_count(self, user):
         return self._ask("bad-password-count", user)
