@@ -108,7 +108,7 @@ void ReadTarget(const std::optional<Word>& word, PolicyLine& line) {
   if (!word) {
     if (!module) {
       Blame(line, Effect::Crashes, "it does not say which file to include", line.controlText);
-    } else if (!line.controlText.empty()) {
+    } else {
       Blame(line, Effect::Fails, "it has no module", line.controlText);
     }
     return;

@@ -21,8 +21,7 @@ struct State {
 };
 
 bool GoesByFrozenChain(Operation operation) {
-  return operation == Operation::SetCredentials || operation == Operation::CloseSession ||
-         operation == Operation::ChangeToken;
+  return operation == Operation::SetCredentials || operation == Operation::CloseSession;
 }
 
 /// One run through a stack.
@@ -126,7 +125,7 @@ class Dispatch {
         LeaveStack();
         break;
       case Action::Kind::Jump:
-        return Jump(action.jump, answer, cached);
+        return Jump(action.jump);
     }
     return true;
   }
@@ -150,13 +149,7 @@ class Dispatch {
 
   void LeaveStack() { position_ = LastOfStack(stack_, position_); }
 
-  bool Jump(std::int32_t count, ReturnCode answer, ReturnCode cached) {
-    if (frozen_ && IsOpen() && (answer != ReturnCode::Ignore || cached == answer)) {
-      if (state_.impression == Impression::Undefined && answer == ReturnCode::Success) {
-        state_.impression = Impression::Positive;
-      }
-      state_.status = answer;
-    }
+  bool Jump(std::int32_t count) {
     JumpTarget target = TargetOfJump(stack_, position_, count);
     position_ = target.last;
     if (!target.inStack) {

@@ -53,8 +53,8 @@ struct Verdict {
 /// for pam_setcred and pam_close_session. One for each stack and login.
 using FrozenChain = std::vector<std::optional<ReturnCode>>;
 
-/// Runs the stack once. SetCredentials, CloseSession and ChangeToken go by the chain that the operation
-/// before them has left; the others fill it anew. A stack without entries is refused.
+/// Runs the stack once. SetCredentials and CloseSession go by the chain that the operation before them has
+/// left, or fill it when there is none; the others fill it anew. A stack without entries is refused.
 Verdict Simulate(const Stack& stack, Operation operation, const Answers& answers, FrozenChain& chain);
 
 }  // namespace velmorctl::pam
