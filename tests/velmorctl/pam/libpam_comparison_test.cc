@@ -277,8 +277,6 @@ std::vector<OddPolicy> OddPolicies() {
        {{"svc", "auth include part1\n"},
         {"part1", "@include part2\n"},
         {"part2", Good() + "session" + tail}}},
-      {"WholeIncludeMissingInInclude",
-       {{"svc", Good() + "auth include part1\n"}, {"part1", "@include nowhere\n"}}},
       {"SubstackMissing", {{"svc", Good() + "auth substack nowhere\n"}}},
       {"SubstackEmpty", {{"svc", "auth substack part1\n" + Good()}, {"part1", "account" + tail + "\n"}}},
       {"SubstackOfItself", {{"svc", "auth substack svc\n" + Good()}}},

@@ -61,11 +61,12 @@ class ServiceCheck {
     }
   }
 
+  /// A pam_deny that nothing leads to is left alone: it does no harm, and pam-auth-update writes such lines.
   void CheckReach(Facility facility) {
     const Stack& stack = policy_.StackOf(facility);
     std::vector<bool> reachable = ReachableEntries(stack);
     for (std::size_t index = 0; index < stack.size(); ++index) {
-      if (!reachable[index]) {
+      if (!reachable[index] && ModuleName(stack[index].module) != "pam_deny") {
         Report({stack[index].origin, stack[index].module,
                 "nothing in the " + std::string(NameOf(facility)) + " stack of \"" + policy_.service +
                     "\" ever leads to this line",

@@ -29,6 +29,24 @@ std::string InWords(const StackEntry& entry, const Step& step) {
   return step.badJump ? words + ", and the jump leads out of the stack" : words;
 }
 
+/// pam_permit and pam_deny only carry out what those before them have led to.
+bool SpeaksForOthers(const StackEntry& entry) {
+  std::string module = ModuleName(entry.module);
+  return module == "pam_permit" || module == "pam_deny";
+}
+
+/// What the modules before a step have answered.
+std::string AnswersBefore(const std::vector<Step>& trace, const Step& decisive, const Stack& stack) {
+  std::string answers;
+  for (const Step& step : trace) {
+    if (step.entry < decisive.entry && stack[step.entry].kind == StackEntry::Kind::Module) {
+      answers += answers.empty() ? ", after " : ", ";
+      answers += ModuleName(stack[step.entry].module) + " " + NameOf(step.answer);
+    }
+  }
+  return answers;
+}
+
 /// What made the verdict of a call what it is.
 std::string ReasonOf(const LoginCall& call, const Stack& stack) {
   std::string result = std::string(NameOf(call.operation)) + " answers " + NameOf(call.verdict.code) + ": ";
@@ -40,7 +58,9 @@ std::string ReasonOf(const LoginCall& call, const Stack& stack) {
   if (decisive == trace.rend()) {
     return result + "no module said yes or no";
   }
-  return result + InWords(stack[decisive->entry], *decisive);
+  const StackEntry& entry = stack[decisive->entry];
+  result += InWords(entry, *decisive);
+  return SpeaksForOthers(entry) ? result + AnswersBefore(trace, *decisive, stack) : result;
 }
 
 class Login {

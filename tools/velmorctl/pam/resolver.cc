@@ -147,6 +147,8 @@ class FileResolver {
     if (Load({IncludedPath(line.target), level, facility}, line, origin)) {
       return true;
     }
+    // Deliberate: what an "@include" does that fails within an "include" libpam leaves to chance, since it
+    // then uses a control that was never set. The worst case counts here.
     if (facility) {
       Add(StackEntry::Kind::AlwaysFails, frame, *facility, line, origin);
     }
