@@ -5,12 +5,12 @@
 
 #include "authentication/active_directory_store.h"
 #include "authentication/library_exceptions.h"
-#include "authentication/provider_exceptions.h"
 #include "authentication/thread_util.h"
 #include "errors/mutex.h"
 #include "errors/request_state.h"
 #include "errors/running_work.h"
 #include "providers/active_directory_provider.h"
+#include "providers/optional_operation.h"
 #include "stores/ad_cache.h"
 
 namespace quenix::authentication {
@@ -43,16 +43,6 @@ void RunAndFinish(const std::string& key, Work work,
     throw;
   }
   finish(key, std::move(failure));
-}
-
-/// `ask()`, or `neutral` when the plug-in lacks the operation.
-template <class Answer, class Ask>
-Answer AskOrElse(Ask ask, Answer neutral) {
-  try {
-    return ask();
-  } catch (const CallNotImplementedException&) {
-    return neutral;
-  }
 }
 
 template <class Step>
@@ -105,8 +95,7 @@ void ActiveDirectoryStore::GetStoreConfigurationInt(Provider provider, const std
 
 void ActiveDirectoryStore::GetTrustedDomainsInt(Provider provider, const std::string& key) {
   const auto ask = [&] {
-    _adCache.SetTrustedDomains(
-        AskOrElse([&] { return provider->GetTrustedDomains(); }, std::deque<Domain>()));
+    _adCache.SetTrustedDomains(AskOrElse([&] { return provider->GetTrustedDomains(); }, {}));
   };
   RunAndFinish(key, ask, &FinishRequest);
 }

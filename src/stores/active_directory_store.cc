@@ -9,6 +9,7 @@
 #include "authentication/library_exceptions.h"
 #include "authentication/provider_exceptions.h"
 #include "providers/active_directory_provider.h"
+#include "providers/optional_operation.h"
 #include "stores/active_store_record.h"
 #include "stores/ad_cache.h"
 
@@ -34,16 +35,6 @@ std::shared_ptr<ActiveDirectoryProvider> LoadConfiguredProvider() {
     return std::make_shared<ActiveDirectoryProvider>(name);
   } catch (const IOError&) {
     throw InvalidActiveDirectoryProviderException(name);
-  }
-}
-
-/// `ask()`, or `fallback` when the plug-in lacks the operation.
-template <class Ask>
-std::string AskOrElse(Ask ask, const std::string& fallback) {
-  try {
-    return ask();
-  } catch (const CallNotImplementedException&) {
-    return fallback;
   }
 }
 
