@@ -151,10 +151,11 @@ class VELMOR_EXPORT ActiveDirectoryStore : public DirectoryStore {
  protected:
   using Provider = std::shared_ptr<ActiveDirectoryProvider>;
 
-  /// Starts `work` for `key` unless a request of that key runs; returns that request.
+  /// Starts `work` for `key` unless a request of that key runs; returns that request. What a scheduler throws
+  /// goes to the caller, and the work does not run, even if the scheduler has kept it.
   static std::shared_ptr<RequestState> StartOrAttachToRequest(const std::string& key,
                                                               std::function<void(const std::string&)> work);
-  /// Ends the request of `key` for all who wait for it; a null `failure` is success.
+  /// Ends the request of `key`, if there is one, for all who wait for it; a null `failure` is success.
   static void FinishRequest(const std::string& key, std::unique_ptr<Exception>&& failure);
 
   /// What a request's thread runs: ask the provider, store the answer in the cache, finish the request.

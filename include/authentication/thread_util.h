@@ -17,9 +17,10 @@ class VELMOR_EXPORT VelmorThreadUtil {
   /// Installs the host's scheduler, which receives every piece of work from then on; an empty callable
   /// removes it.
   ///
-  /// The scheduler must not run the work on the calling thread: it is called with a lock held that the work
-  /// takes at its end. The work may throw, when a provider plug-in threw something that is not an Exception.
-  /// A host that unloads the library must first have run and destroyed all work that it was given.
+  /// The scheduler must neither run the work on the calling thread nor wait for other work: it is called with
+  /// a lock held that all work takes. Work of which the scheduler threw does nothing when it is run all the
+  /// same. The work may throw, when a provider plug-in threw something that is not an Exception. A host that
+  /// unloads the library must first have run and destroyed all work that it was given.
   ///
   /// No lock guards this: call it before the first store operation, and not while other threads use the
   /// library.

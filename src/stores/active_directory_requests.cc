@@ -54,6 +54,15 @@ void RunIgnoringFailure(Step step) {
   }
 }
 
+using Requests = std::unordered_map<std::string, std::shared_ptr<RequestState>>;
+
+/// Whether the request of `key` that is in flight is this one.
+bool IsInFlight(const Requests& requests, const std::string& key,
+                const std::shared_ptr<RequestState>& state) {
+  const auto request = requests.find(key);
+  return request != requests.end() && request->second == state;
+}
+
 }  // namespace
 
 std::shared_ptr<RequestState> ActiveDirectoryStore::StartOrAttachToRequest(
@@ -63,7 +72,15 @@ std::shared_ptr<RequestState> ActiveDirectoryStore::StartOrAttachToRequest(
   if (started) {
     try {
       VelmorThreadUtil::ScheduleFunctor(
-          [running = RunningWork(), key, work = std::move(work)] { work(key); });
+          [running = RunningWork(), key, state = request->second, work = std::move(work)] {
+            {
+              // A scheduler may queue this and then throw: its request is gone then, and one of the same key
+              // that is in flight by now is not its own to end. Started before the throw, it waits here.
+              const MutexLock lookUp(_lock);
+              if (!IsInFlight(_asyncRequests, key, state)) return;
+            }
+            work(key);
+          });
     } catch (...) {
       _asyncRequests.erase(request);
       throw;
@@ -75,7 +92,6 @@ std::shared_ptr<RequestState> ActiveDirectoryStore::StartOrAttachToRequest(
 void ActiveDirectoryStore::FinishRequest(const std::string& key, std::unique_ptr<Exception>&& failure) {
   const MutexLock lock(_lock);
   const auto request = _asyncRequests.find(key);
-  // A scheduler may queue the work and then fail: its request is gone when the work ends.
   if (request == _asyncRequests.end()) return;
   request->second->Done(std::move(failure));
   _asyncRequests.erase(request);

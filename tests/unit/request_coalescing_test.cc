@@ -125,17 +125,18 @@ TEST(RequestTest, AThreadThatCannotBeStartedRemovesTheRequest) {
   request->WaitResult(60);
 }
 
-TEST(RequestTest, ASchedulerThatQueuesAndThenThrowsDoesNoHarm) {
-  std::function<void()> queued;
+/// Starts a request through a scheduler that hands the work on and then throws. The work says in `ran` that
+/// it ran, and ends its request.
+void StartThroughAFailingScheduler(const std::function<void(std::function<void()>)>& handOn, bool& ran) {
   VelmorThreadUtil::SetScheduler([&](std::function<void()> work) {
-    queued = std::move(work);
+    handOn(std::move(work));
     throw std::runtime_error("pool is closing");
   });
-  EXPECT_THROW_WHAT(StoreProbe::StartOrAttachToRequest(
-                        "key", [](const std::string& key) { StoreProbe::FinishRequest(key, nullptr); }),
-                    std::runtime_error, "pool is closing");
-  EXPECT_EQ(StoreProbe::RequestsInFlight(), 0U);
-  queued();  // Its request is gone; ending it must not follow the missing key.
+  const auto work = [&ran](const std::string& key) {
+    ran = true;
+    StoreProbe::FinishRequest(key, std::make_unique<IOError>("of the first"));
+  };
+  EXPECT_THROW_WHAT(StoreProbe::StartOrAttachToRequest("key", work), std::runtime_error, "pool is closing");
   EXPECT_EQ(StoreProbe::RequestsInFlight(), 0U);
   VelmorThreadUtil::SetScheduler(nullptr);
 }
@@ -143,6 +144,60 @@ TEST(RequestTest, ASchedulerThatQueuesAndThenThrowsDoesNoHarm) {
 TEST(RequestTest, TheLockIsFreeAfterASchedulingFailure) {
   VelmorThreadUtil::SetScheduler([](std::function<void()>) { throw std::runtime_error("no"); });
   EXPECT_THROW(StoreProbe::StartOrAttachToRequest("key", [](const std::string&) {}), std::runtime_error);
+TEST(RequestTest, WorkOfWhichTheSchedulerThrewDoesNothing) {
+  std::function<void()> queued;
+  bool ran = false;
+  StartThroughAFailingScheduler([&](std::function<void()> work) { queued = std::move(work); }, ran);
+  queued();
+  EXPECT_FALSE(ran);
+  EXPECT_EQ(StoreProbe::RequestsInFlight(), 0U);
+}
+
+TEST(RequestTest, WorkThatStartsBeforeTheSchedulerThrowsDoesNothing) {
+  std::thread pool;
+  bool ran = false;
+  StartThroughAFailingScheduler([&](std::function<void()> work) { pool = std::thread(std::move(work)); },
+                                ran);
+  pool.join();
+  EXPECT_FALSE(ran);
+}
+
+TEST(RequestTest, WorkOfWhichTheSchedulerThrewDoesNotEndALaterRequest) {
+  std::function<void()> queued;
+  bool ran = false;
+  StartThroughAFailingScheduler([&](std::function<void()> work) { queued = std::move(work); }, ran);
+  KeptWork kept;
+  const auto later = StoreProbe::StartOrAttachToRequest(
+      "key", [](const std::string& key) { StoreProbe::FinishRequest(key, nullptr); });
+  queued();
+  EXPECT_FALSE(ran);
+  EXPECT_TRUE(StoreProbe::IsInFlight("key"));
+  EXPECT_THROW(later->WaitResult(0), ProviderCallTimedOutException);
+  kept.RunNext();
+  later->WaitResult(0);
+  EXPECT_FALSE(StoreProbe::IsInFlight("key"));
+}
+
+TEST(RequestTest, WorkThatIsRunTwiceEndsItsOwnRequestOnly) {
+  std::function<void()> queued;
+  VelmorThreadUtil::SetScheduler([&](std::function<void()> work) { queued = std::move(work); });
+  const auto finish = [](const std::string& key) { StoreProbe::FinishRequest(key, nullptr); };
+  StoreProbe::StartOrAttachToRequest("key", finish);
+  queued();
+  KeptWork kept;
+  const auto later = StoreProbe::StartOrAttachToRequest("key", finish);
+  queued();
+  EXPECT_THROW(later->WaitResult(0), ProviderCallTimedOutException);
+  kept.RunNext();
+  later->WaitResult(0);
+}
+
+TEST(RequestTest, EndingARequestThatIsNotInFlightDoesNothing) {
+  StoreProbe::FinishRequest("key", nullptr);
+  StoreProbe::FinishRequest("key", std::make_unique<IOError>("failed"));
+  EXPECT_EQ(StoreProbe::RequestsInFlight(), 0U);
+}
+
   VelmorThreadUtil::SetScheduler(nullptr);
   std::size_t inFlight = 1;
   std::thread([&] { inFlight = StoreProbe::RequestsInFlight(); }).join();
