@@ -4,6 +4,8 @@
 
 #include <pthread.h>
 
+#include <climits>
+
 namespace quenix::authentication {
 
 /// A reference to the shared object that holds this code, as dlopen() counts them.
@@ -28,7 +30,8 @@ class LibraryPin {
   void* library_;
 };
 
-/// The place where a thread keeps what it releases at its end; exists as long as the library is loaded.
+/// The place where a thread keeps what it releases at its end; exists as long as the library is loaded. A
+/// process has only so many of these: when there is none left, nothing can be kept.
 class ThreadEndKey {
  public:
   ThreadEndKey() noexcept;
@@ -39,7 +42,8 @@ class ThreadEndKey {
   pthread_key_t Native() const noexcept { return key_; }
 
  private:
-  pthread_key_t key_{};
+  // A number that no key can have: using and deleting it fails. 0 would be somebody else's key.
+  pthread_key_t key_ = PTHREAD_KEYS_MAX;
 };
 
 /// The process's one key; see process_wide.cc.

@@ -3,8 +3,10 @@
 #include <dlfcn.h>
 #include <gtest/gtest.h>
 #include <malloc.h>
+#include <pthread.h>
 
 #include <atomic>
+#include <cerrno>
 #include <cstdlib>
 #include <memory>
 #include <string>
@@ -149,6 +151,48 @@ TEST(UnloadingTest, ALibraryThatIsLoadedAgainWhileAWorkerRunsIsTheSame) {
   EXPECT_TRUE(LibraryIsMapped());
   second.Unload();
   EXPECT_FALSE(LibraryIsMapped());
+}
+
+TEST(UnloadingTest, AThreadThatCouldNotBeStartedDoesNotKeepTheLibrary) {
+  InstallPlugin("version3");
+  ConfigureProvider("version3");
+  {
+    const LoadedLibrary library;
+    const auto store = library.CreateStore("Active Directory");
+    const TakeOver refuse(calls::pthreadCreate, [](auto...) { return EAGAIN; });
+    EXPECT_THROW(store->GetStoreConfiguration(), std::exception);
+  }
+  EXPECT_FALSE(LibraryIsMapped());
+}
+
+/// Takes every place that the process has for what threads keep to themselves.
+void UseUpThreadKeys() {
+  pthread_key_t key{};
+  while (pthread_key_create(&key, nullptr) == 0) {
+  }
+}
+
+TEST(UnloadingTest, WithoutAThreadKeyOfItsOwnTheLibraryTakesNobodyElses) {
+  UseUpThreadKeys();
+  {
+    const LoadedLibrary library;
+    EXPECT_EQ(library.RegisteredStores(), STORES);
+  }
+  EXPECT_FALSE(LibraryIsMapped());
+  pthread_key_t key{};
+  EXPECT_EQ(pthread_key_create(&key, nullptr), EAGAIN);
+}
+
+TEST(UnloadingTest, WithoutAThreadKeyAWorkerKeepsTheLibraryForGood) {
+  InstallPlugin("version3");
+  ConfigureProvider("version3");
+  UseUpThreadKeys();
+  {
+    const LoadedLibrary library;
+    EXPECT_NE(library.CreateStore("Active Directory")->GetStoreConfiguration(), nullptr);
+    AwaitEndOfWorkers();
+  }
+  EXPECT_TRUE(LibraryIsMapped());
 }
 
 TEST(UnloadingTest, LoadingOftenUsesNothingUp) {
