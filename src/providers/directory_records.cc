@@ -1,14 +1,14 @@
 #include "authentication/directory_records.h"
 
 #include <ostream>
+#include <string_view>
 
 namespace quenix::authentication {
 
 namespace {
 
-const std::string& NameOrUnset(const std::string& name) {
-  static const std::string unset = "(unset)";
-  return name.empty() ? unset : name;
+std::string_view NameOrUnset(const std::string& name) {
+  return name.empty() ? "(unset)" : std::string_view(name);
 }
 
 }  // namespace
