@@ -29,7 +29,8 @@ int SyncToDisk(const std::string& path) {
 
 void Rename(const std::string& from, const std::string& to) {
   if (rename(from.c_str(), to.c_str()) != 0) {
-    throw IOError("Unable to rename '" + from + "' to '" + to + "': " + SystemText(errno));
+    const std::string reason = SystemText(errno);
+    throw IOError("Unable to rename '" + from + "' to '" + to + "': " + reason);
   }
 }
 
@@ -50,8 +51,8 @@ void AtomicFileStream::open(const char* path, std::ios_base::openmode mode) {
   std::snprintf(name.data(), name.size(), "%s.XXXXXX", path);
   const int descriptor = mkstemp(name.data());
   if (descriptor < 0) {
-    throw IOError(std::string("Unable to create temporary file to write '") + path +
-                  "': " + SystemText(errno));
+    const std::string reason = SystemText(errno);
+    throw IOError(std::string("Unable to create temporary file to write '") + path + "': " + reason);
   }
   ::close(descriptor);
   temporaryPath_ = name.data();

@@ -18,7 +18,8 @@ bool IsBlank(const std::string& line) {
 }
 
 [[noreturn]] void ThrowIOError(const char* action, const std::string& path) {
-  throw IOError(std::string("Unable to ") + action + " '" + path + "': " + SystemText(errno));
+  const std::string reason = SystemText(errno);
+  throw IOError(std::string("Unable to ") + action + " '" + path + "': " + reason);
 }
 
 }  // namespace
