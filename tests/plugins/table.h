@@ -32,6 +32,15 @@
 #ifndef GET_HOST_PRINCIPAL_FOR_DOMAIN
 #define GET_HOST_PRINCIPAL_FOR_DOMAIN 0
 #endif
+#ifndef GET_DOMAIN_TRUST_RELATIONSHIP
+#define GET_DOMAIN_TRUST_RELATIONSHIP 0
+#endif
+#ifndef SET_SMART_CARD_ENABLED_SERVICES
+#define SET_SMART_CARD_ENABLED_SERVICES 0
+#endif
+#ifndef GET_SMART_CARD_ENABLED_SERVICES
+#define GET_SMART_CARD_ENABLED_SERVICES 0
+#endif
 
 const struct ActiveDirectoryClientMetadata ActiveDirectoryClientMetadata = {
     METADATA_VERSION, "pam_test", PAM_PARAMETERS, "nss_test", NSS_PARAMETERS};
@@ -42,6 +51,9 @@ const struct ActiveDirectoryClientOperations ActiveDirectoryClientOperations = {
     .getTrustedDomains = GET_TRUSTED_DOMAINS,
     .joinDomainWithMachineAccount = JOIN_DOMAIN_WITH_MACHINE_ACCOUNT,
     .getHostPrincipalForDomain = GET_HOST_PRINCIPAL_FOR_DOMAIN,
+    .getDomainTrustRelationship = GET_DOMAIN_TRUST_RELATIONSHIP,
+    .setSmartCardEnabledServices = SET_SMART_CARD_ENABLED_SERVICES,
+    .getSmartCardEnabledServices = GET_SMART_CARD_ENABLED_SERVICES,
 };
 
 #endif /* PLUGINS_TABLE_H */

@@ -101,7 +101,8 @@ TEST_F(AtomicFileStreamTest, ATemporaryFileThatCannotBeCreatedIsAnError) {
 
 TEST_F(AtomicFileStreamTest, ATargetNameBeyondTheBufferCannotBeCreated) {
   const std::string path = folder_.Path() + std::string(4096, 'x');
-  EXPECT_THROW(AtomicFileStream(path.c_str(), std::ios_base::out), IOError);
+  EXPECT_THROW_WHAT(AtomicFileStream(path.c_str(), std::ios_base::out), IOError,
+                    "Unable to create temporary file to write '" + path + "': Invalid argument");
   EXPECT_TRUE(NamesIn(folder_.Path()).empty());
 }
 
@@ -130,10 +131,10 @@ TEST_F(AtomicFileStreamTest, ANewTargetKeepsTheTemporaryFilesMode) {
 
 TEST_F(AtomicFileStreamTest, AnExistingTargetsModeIsCarriedOver) {
   WriteFile(target_, "old");
-  testsupport::SetMode(target_, 0751);
+  testsupport::SetMode(target_, 01751);
   AtomicFileStream stream(target_.c_str(), std::ios_base::out);
   stream.Commit();
-  EXPECT_EQ(ModeOf(target_), 0751U);
+  EXPECT_EQ(ModeOf(target_), 01751U);
 }
 
 TEST_F(AtomicFileStreamTest, StepsComeInOrderAndTheDataIsOnTheDiskBeforeTheRename) {
@@ -251,8 +252,9 @@ TEST_F(AtomicFileStreamTest, DataThatCannotBeBroughtToTheDiskLeavesTheTarget) {
   });
   AtomicFileStream stream(target_.c_str(), std::ios_base::out);
   stream << "new";
-  EXPECT_THROW(stream.Commit(), IOError);
+  EXPECT_THROW_WHAT(stream.Commit(), IOError, "Unable to write '" + target_ + "': Input/output error");
   EXPECT_EQ(ReadFile(target_), "old");
+  EXPECT_EQ(ReadFile(Temporary()), "new");
 }
 
 TEST_F(AtomicFileStreamTest, ADanglingLinkAsTargetIsReplaced) {

@@ -121,7 +121,8 @@ TEST_F(ConfigurationTest, ALinkInACircleCannotBeOpened) {
 }
 
 TEST_F(ConfigurationTest, AFolderIsNoEmptyConfiguration) {
-  EXPECT_THROW(Configuration{folder_.Path()}, IOError);
+  EXPECT_THROW_WHAT(Configuration(folder_.Path()), IOError,
+                    "Unable to read '" + folder_.Path() + "': Is a directory");
 }
 
 TEST_F(ConfigurationTest, AMissingKeyIsAnErrorForReaders) {

@@ -1,7 +1,9 @@
 #include "authentication/authentication_store_factory.h"
 
 #include <gtest/gtest.h>
+#include <sys/time.h>
 
+#include <cerrno>
 #include <memory>
 #include <string>
 #include <thread>
@@ -12,11 +14,15 @@
 #include "plugins/scripted_plugin.h"
 #include "support/expect_throw_what.h"
 #include "support/files.h"
+#include "support/gate.h"
+#include "support/interpose.h"
 
 namespace quenix::authentication {
 namespace {
 
+using testsupport::TakeOver;
 using testsupport::WriteFile;
+namespace calls = testsupport::calls;
 
 AuthenticationStoreFactory& Factory() {
   return *Singleton<AuthenticationStoreFactory>::_instance;
@@ -39,6 +45,32 @@ TEST(FactoryTest, CreatesTheActiveDirectoryStore) {
   testsupport::UseScriptedPlugin();
   const auto store = Factory().CreateInstance("Active Directory");
   EXPECT_NE(dynamic_cast<ActiveDirectoryStore*>(store.get()), nullptr);
+}
+
+TEST(FactoryTest, TheActiveDirectoryStoreWaitsSixtySeconds) {
+  testsupport::Gate gate;
+  testsupport::UseScriptedPlugin().getActiveDomain = [&gate](auto* domain, auto* release) {
+    gate.Pass();
+    return testsupport::Answer(domain, release, {"", ""});
+  };
+  const auto store = Factory().CreateInstance("Active Directory");
+  timeval before{};
+  timeval after{};
+  timespec deadline{};
+  {
+    const TakeOver look(calls::pthreadCondTimedwait,
+                        [&](pthread_cond_t*, pthread_mutex_t*, const timespec* time) {
+                          deadline = *time;
+                          return ETIMEDOUT;
+                        });
+    gettimeofday(&before, nullptr);
+    store->GetStoreConfiguration();
+    gettimeofday(&after, nullptr);
+  }
+  EXPECT_GE(deadline.tv_sec, before.tv_sec + 60);
+  EXPECT_LE(deadline.tv_sec, after.tv_sec + 60);
+  gate.Open();
+  store->GetStoreConfiguration();  // The first worker has left the gate when this one is answered.
 }
 
 TEST(FactoryTest, CreatesANewStoreOnEachCall) {

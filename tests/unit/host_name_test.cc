@@ -129,6 +129,15 @@ TEST_F(HostNameTest, AnotherDomainIsLoggedAndTheSearchDomainAddedWhenItResolves)
   EXPECT_EQ(Entries(), (std::vector<Words>{{ADDRESS, "host1.other.test", "host1"}}));
 }
 
+TEST_F(HostNameTest, AShorterOrLongerDomainIsAnotherOne) {
+  for (const std::string domain : {"example", "example.test2"}) {
+    testsupport::ForgetLog();
+    Name("host1", "127.0.1.1 host1." + domain + " host1\n");
+    Sanitise();
+    EXPECT_EQ(RecordedLog().size(), 1U) << domain;
+  }
+}
+
 TEST_F(HostNameTest, ADomainThatDoesNotResolveLeavesTheResolverAlone) {
   Name("host1", "127.0.1.1 host1.other.test host1\n");
   Sanitise();
@@ -243,7 +252,7 @@ TEST_F(HostNameTest, ANameThatFillsTheBufferIsReadToItsEndAndNoFurther) {
 
 TEST_F(HostNameTest, ANameOfSixtyFourCharactersIsTakenAsTheSystemLeavesIt) {
   Name(std::string(64, 'h'), "127.0.0.1 localhost\n");
-  EXPECT_THROW(Sanitise(), InvalidHostNameException);
+  EXPECT_THROW_WHAT(Sanitise(), InvalidHostNameException, INVALID + "unable to get hostname");
 }
 
 TEST_F(HostNameTest, ANameOfSixtyThreeCharactersIsAccepted) {
@@ -301,6 +310,28 @@ TEST_F(HostNameTest, AnUnreadableHostsFileFailsBeforeTheHostNameIsAsked) {
   testsupport::MakeFolders("/etc/hosts");
   EXPECT_THROW(Sanitise(), HostMgmt::Lib::HostMgmtException);
   EXPECT_FALSE(asked);
+}
+
+TEST_F(HostNameTest, AResolverThatCannotBeRepairedIsThePlatformsErrorAndEndsTheCheck) {
+  Name("host1", "127.0.1.1 host1.other.test host1\n192.0.2.99 example.test\n");
+  const TakeOver refuse(calls::rename, [](const char* from, const char* to) {
+    if (to != std::string("/etc/resolv.conf")) {
+      return calls::rename.Real(from, to);
+    }
+    errno = EROFS;
+    return -1;
+  });
+  EXPECT_THROW(Sanitise(), HostMgmt::Lib::HostMgmtException);
+  EXPECT_TRUE(Entries().empty());
+}
+
+TEST(HostNameWithoutInterfaceTest, TheRepairedResolverStays) {
+  testsupport::UseScriptedPlugin();
+  const ActiveDirectoryStore store(60);
+  testsupport::SetHostName("host1");
+  WriteFile("/etc/hosts", "127.0.1.1 host1.other.test host1\n192.0.2.99 example.test\n");
+  EXPECT_THROW(store.SanitiseHostnameForDomain("example.test"), HostMgmt::Lib::HostMgmtException);
+  EXPECT_NE(ReadFile("/etc/resolv.conf").find("search example.test\n"), std::string::npos);
 }
 
 TEST(HostNameWithoutInterfaceTest, TheMissingManagementAddressIsThePlatformsError) {

@@ -98,7 +98,9 @@ TEST(ProviderLoadingTest, AnEmptyFileIsAnError) {
 
 TEST(ProviderLoadingTest, AFolderInThePluginsPlaceIsAnError) {
   testsupport::MakeFolders(InstalledPlugin("folder"));
-  EXPECT_THROW(ActiveDirectoryProvider("folder"), IOError);
+  EXPECT_THROW_WHAT(ActiveDirectoryProvider("folder"), IOError,
+                    "Unable to open provider: /usr/libexec/velmor/libfolder.so: cannot read file data: "
+                    "Is a directory");
 }
 
 TEST(ProviderLoadingTest, ALoaderWithoutATextIsAnErrorAllTheSame) {

@@ -368,6 +368,26 @@ TEST_F(ProviderOperationsTest, NothingIsReleasedWhenAnArrayOrADomainFails) {
   EXPECT_THROW_WHAT(provider_.GetActiveDomain(), AccessDeniedException, REFUSED);
 }
 
+TEST_F(ProviderOperationsTest, WithoutAFreeFunctionNothingIsReleased) {
+  static char text[] = "text";
+  static char* texts[] = {text, nullptr};
+  script_.getMachineAccountDN = [](char** answer, ActiveDirectoryFree*) {
+    *answer = text;
+    return 0U;
+  };
+  script_.getActiveDomain = [](ActiveDirectoryDomainPair* domain, ActiveDirectoryFree*) {
+    domain->dnsName = text;
+    return 0U;
+  };
+  script_.getSmartCardEnabledServices = [](char*** names, ActiveDirectoryFree*) {
+    *names = texts;
+    return 0U;
+  };
+  EXPECT_EQ(provider_.GetMachineAccountDN(), "text");
+  EXPECT_EQ(provider_.GetActiveDomain().dnsName, "text");
+  EXPECT_EQ(provider_.GetSmartCardEnabledServices(), (Names{"text"}));
+}
+
 TEST_F(ProviderOperationsTest, AStatusOfAnOperationWithoutResultIsThrown) {
   const auto refuse = [](auto...) { return 5U; };
   script_.partDomain = refuse;
@@ -425,9 +445,19 @@ TEST(VersionGateTest, AFilledSlotOfAnOldTableIsNotImplemented) {
   EXPECT_THROW_WHAT(provider.GetHostPrincipalForDomain("d"), CallNotImplementedException, NOT_IMPLEMENTED);
 }
 
-TEST(VersionGateTest, TheVersionOfTheMetadataDoesNotCount) {
+TEST(VersionGateTest, ATableOfVersionTwoIsEnoughWhateverTheMetadataSays) {
   testsupport::InstallPlugin("old_metadata");
-  EXPECT_EQ(ActiveDirectoryProvider("old_metadata").GetHostPrincipalForDomain("d"), "HOST$@EXAMPLE.TEST");
+  const ActiveDirectoryProvider provider("old_metadata");
+  EXPECT_EQ(provider.GetHostPrincipalForDomain("d"), "HOST$@EXAMPLE.TEST");
+  EXPECT_THROW_WHAT(provider.JoinDomainWithMachineAccount({}, {}), AccessDeniedException, REFUSED);
+}
+
+TEST(VersionGateTest, TheLastThreeSlotsAreReadWhateverTheVersion) {
+  testsupport::InstallPlugin("late_slots");
+  const ActiveDirectoryProvider provider("late_slots");
+  EXPECT_EQ(provider.GetDomainTrustRelationship("d"), TRUST_RELATIONSHIP_OUTBOUND);
+  EXPECT_THROW(provider.SetSmartCardEnabledServices({}), AccessDeniedException);
+  EXPECT_THROW(provider.GetSmartCardEnabledServices(), InvalidPasswordException);
 }
 
 }  // namespace

@@ -4,6 +4,9 @@
 
 #include <atomic>
 #include <cerrno>
+#include <chrono>
+#include <cstdlib>
+#include <exception>
 #include <functional>
 #include <memory>
 #include <stdexcept>
@@ -141,9 +144,6 @@ void StartThroughAFailingScheduler(const std::function<void(std::function<void()
   VelmorThreadUtil::SetScheduler(nullptr);
 }
 
-TEST(RequestTest, TheLockIsFreeAfterASchedulingFailure) {
-  VelmorThreadUtil::SetScheduler([](std::function<void()>) { throw std::runtime_error("no"); });
-  EXPECT_THROW(StoreProbe::StartOrAttachToRequest("key", [](const std::string&) {}), std::runtime_error);
 TEST(RequestTest, WorkOfWhichTheSchedulerThrewDoesNothing) {
   std::function<void()> queued;
   bool ran = false;
@@ -198,6 +198,9 @@ TEST(RequestTest, EndingARequestThatIsNotInFlightDoesNothing) {
   EXPECT_EQ(StoreProbe::RequestsInFlight(), 0U);
 }
 
+TEST(RequestTest, TheLockIsFreeAfterASchedulingFailure) {
+  VelmorThreadUtil::SetScheduler([](std::function<void()>) { throw std::runtime_error("no"); });
+  EXPECT_THROW(StoreProbe::StartOrAttachToRequest("key", [](const std::string&) {}), std::runtime_error);
   VelmorThreadUtil::SetScheduler(nullptr);
   std::size_t inFlight = 1;
   std::thread([&] { inFlight = StoreProbe::RequestsInFlight(); }).join();
@@ -214,6 +217,26 @@ class WorkerTest : public ::testing::Test {
     auto request = StoreProbe::StartOrAttachToRequest("key", worker);
     kept.RunNext();
     return request;
+  }
+
+  /// Runs a worker that cannot complete its request, since that takes the lock, until its answer is cached.
+  static void ExpectCachedWhileInFlight(const Worker& worker, const std::function<bool()>& isCached) {
+    Gate gate;
+    const auto request = StoreProbe::StartOrAttachToRequest("key", [&gate, worker](const std::string& key) {
+      gate.Pass();
+      worker(key);
+    });
+    gate.AwaitArrivals(1);
+    {
+      const MutexLock lock(StoreProbe::_lock);
+      gate.Open();
+      const auto limit = std::chrono::steady_clock::now() + std::chrono::seconds(20);
+      while (!isCached() && std::chrono::steady_clock::now() < limit) {
+        std::this_thread::yield();
+      }
+      EXPECT_TRUE(isCached());
+    }
+    request->WaitResult(60);
   }
 
   Worker TrustedDomains() {
@@ -236,7 +259,23 @@ class WorkerTest : public ::testing::Test {
   ADCache& cache_ = StoreProbe::_adCache;
 };
 
-TEST_F(WorkerTest, TrustedDomainsReachTheCacheBeforeTheRequestIsDone) {
+TEST_F(WorkerTest, AnswersReachTheCacheBeforeTheirRequestsAreDone) {
+  script_.getTrustedDomains = [](auto*** domains, auto* release) {
+    return Answer(domains, release, std::vector<NamePair>{{"a.test", "A"}});
+  };
+  script_.getDomainTrustState = [] { return TRUST_STATE_HEALTHY; };
+  script_.getDomainTrustRelationship = [](const char*) { return TRUST_RELATIONSHIP_TWO_WAY; };
+  script_.getMachineAccountDN = [](char** text, auto* release) { return Answer(text, release, "CN=HOST"); };
+  ExpectCachedWhileInFlight(TrustedDomains(), [this] { return !cache_.GetTrustedDomains().empty(); });
+  ExpectCachedWhileInFlight(State(), [this] { return cache_.GetDomainTrustState() == TRUST_STATE_HEALTHY; });
+  ExpectCachedWhileInFlight(Relationship(), [this] {
+    return cache_.GetDomainTrustRelationship("other.test") == TRUST_RELATIONSHIP_TWO_WAY;
+  });
+  ExpectCachedWhileInFlight(Configuration(),
+                            [this] { return cache_.GetConfiguration().machineAccountDN == "CN=HOST"; });
+}
+
+TEST_F(WorkerTest, TrustedDomainsReachTheCache) {
   script_.getTrustedDomains = [](auto*** domains, auto* release) {
     return Answer(domains, release, std::vector<NamePair>{{"b.test", "B"}, {"a.test", "A"}});
   };
@@ -373,6 +412,23 @@ TEST_F(WorkerTest, AStandardExceptionOutOfAnyOtherWorkerEndsTheRequestAndLeavesT
     EXPECT_EQ(StoreProbe::RequestsInFlight(), 0U);
   }
   EXPECT_EQ(cache_.GetDomainTrustState(), 7U);
+}
+
+TEST_F(WorkerTest, OnAThreadSomethingUnexpectedReachesTheWaiterThoughItEndsTheProcess) {
+  script_.getTrustedDomains = [](auto...) -> std::uint32_t { throw std::out_of_range("inside the plug-in"); };
+  EXPECT_EXIT(
+      {
+        std::set_terminate([] { Gate().Pass(); });  // Holds the process's end up.
+        const auto request = StoreProbe::StartOrAttachToRequest("key", TrustedDomains());
+        try {
+          request->WaitResult(30);
+        } catch (const ThreadErrorException& failure) {
+          std::_Exit(failure.what() == UNEXPECTED ? 0 : 1);
+        } catch (...) {
+        }
+        std::_Exit(2);
+      },
+      ::testing::ExitedWithCode(0), "");
 }
 
 }  // namespace
