@@ -32,7 +32,8 @@ class RequestState;
 /// GetDomainTrustRelationship) ask the provider plug-in on a thread of their own and wait for it no longer
 /// than the store's time-out; then they log a warning and answer from the process-wide cache, while the call
 /// runs on and refreshes the cache at its end. Callers that ask the same at once share one call. A failure of
-/// the call is thrown to each of them. All other operations last as long as the plug-in takes.
+/// the call is thrown to each of them; ThreadErrorException says that no thread could be started or waited
+/// for. All other operations last as long as the plug-in takes and throw the exception of its status.
 class VELMOR_EXPORT ActiveDirectoryStore : public DirectoryStore {
  public:
   /// Loads the provider plug-in that ProviderConfiguration names. The factory's stores wait 60 seconds.
@@ -48,15 +49,15 @@ class VELMOR_EXPORT ActiveDirectoryStore : public DirectoryStore {
   /// "Active Directory".
   std::string GetDisplayName() const override;
 
-  /// Records this store as the active one and refreshes the cache. *Deliberate:* it writes even if it is
-  /// recorded already, and does not deactivate the store that was active before.
+  /// Records this store as the active one and refreshes the cache as UpdateCache() does. *Deliberate:* it
+  /// writes even if it is recorded already, and does not deactivate the store that was active before.
   /// Throws what reading and writing AuthenticationConfiguration throws, and InvalidKeyException when it has
   /// no "remote-authentication-store".
   void MakeActive() override;
 
   ~ActiveDirectoryStore() override;
 
-  /// Refreshes the cache; writes nothing.
+  /// Refreshes the cache as UpdateCache() does; writes nothing.
   void MakeInactive() override;
 
   /// Joins the host to `domain`: a DNS name, or that and, behind the first "/", the organizational unit for
@@ -81,7 +82,7 @@ class VELMOR_EXPORT ActiveDirectoryStore : public DirectoryStore {
   void ImportCertificateForCAM(const std::string& certificate);
 
   /// As above with the text of the file at `path`; the second argument is not used. Throws
-  /// FileNotFoundException when the file cannot be opened.
+  /// FileNotFoundException when the file cannot be opened, and IOError when it cannot be read.
   void ImportCertificateForCAM(const std::string& path, const std::string& unused);
 
   /// Joins the host with a computer account that the CAM server creates in `container`, or in the directory's
@@ -125,8 +126,9 @@ class VELMOR_EXPORT ActiveDirectoryStore : public DirectoryStore {
   std::deque<Domain> GetTrustedDomains() const;
 
   /// A question: the state of the trust with the joined domain. Asks GetTrustedDomains() first, with a wait
-  /// of its own. *Deliberate:* when the trust state itself is late, the answer is TRUST_STATE_TIMED_OUT and
-  /// the cache holds that too, since an old "healthy" would hide the trouble.
+  /// of its own; when the plug-in misses a file there, the answer is TRUST_STATE_NOT_KNOWN. *Deliberate:*
+  /// when the trust state itself is late, the answer is TRUST_STATE_TIMED_OUT and the cache holds that too,
+  /// since an old "healthy" would hide the trouble.
   TrustState GetDomainTrustState() const;
 
   /// A question: how the joined domain and the one of that DNS name trust each other.
@@ -140,7 +142,9 @@ class VELMOR_EXPORT ActiveDirectoryStore : public DirectoryStore {
   bool FetchScEnabledSvcs();
 
   /// Refreshes the whole cache, and sets whether the smart-card daemon's policy is on when a value is given.
-  /// Lasts up to one time-out for each question. Failures are logged, not thrown.
+  /// Lasts up to one time-out for each question, and as long as the plug-in takes for the smart-card
+  /// services. Failures are logged; only what is no Exception, from the host's scheduler or out of a plug-in,
+  /// is thrown.
   void UpdateCache(std::optional<bool> pcscdServicePolicy);
 
   /// Makes sure that the host's name can be used as a computer name in `domain`: adds the domain to the DNS

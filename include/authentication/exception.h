@@ -19,8 +19,7 @@ class VELMOR_EXPORT Exception : public std::exception {
   explicit Exception(const std::string& message);
 
   /// A failure with a code: what() is "Exception 0x", the code in at least eight lower-case hexadecimal
-  /// digits,
-  /// ": " and `message`.
+  /// digits, a colon, a blank and `message`.
   Exception(unsigned long code, const std::string& message);
 
   Exception(const Exception& other);

@@ -6,10 +6,9 @@
 
 namespace quenix::authentication {
 
-/// The SHA-1 digest of the first certificate in a PEM text: 20 pairs of upper-case hexadecimal digits
-/// separated by
-/// ":". Throws InvalidCertificateException when the text holds no certificate in PEM form. Leaves the
-/// thread's queue of OpenSSL errors as it was.
+/// The SHA-1 digest of the first certificate in a PEM text: 20 pairs of upper-case hexadecimal digits with
+/// colons between them. Throws InvalidCertificateException when the text holds no certificate in PEM form.
+/// Leaves the thread's queue of OpenSSL errors as it was.
 std::string CertificateThumbprint(const std::string& pem);
 
 }  // namespace quenix::authentication
