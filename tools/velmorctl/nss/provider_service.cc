@@ -2,19 +2,35 @@
 
 #include "active_provider.h"
 #include "failure.h"
+#include "nss/criterion.h"
 #include "nss/words.h"
+#include "text.h"
 
 namespace velmorctl {
+
+namespace {
+
+Failure BadPlugin(const PluginDescription& plugin, const std::string& happened, const std::string& value) {
+  return Failure(ExitCode::ProviderUnusable, "the provider '" + plugin.name + "' " + happened)
+      .Detail("file", plugin.file)
+      .Detail("value", Printable(value))
+      .Try("install the package that brings this plug-in again");
+}
+
+}  // namespace
 
 ServiceMeaning ProviderService(const RootFolder& root) {
   const PluginDescription plugin = ActiveProvider(root);
   if (!IsServiceName(plugin.nssModule)) {
-    throw Failure(ExitCode::ProviderUnusable, "the provider '" + plugin.name + "' names no service")
-        .Detail("file", plugin.file)
-        .Detail("value", plugin.nssModule)
-        .Try("install the package that brings this plug-in again");
+    throw BadPlugin(plugin, "names no service", plugin.nssModule);
   }
-  return {plugin.nssModule, SplitWords(plugin.nssModuleParameters)};
+  ServiceMeaning service = {plugin.nssModule, SplitWords(plugin.nssModuleParameters)};
+  // Brackets that it cannot read make the C library use no line of the whole file.
+  if (!service.criterion.empty() && !ParseCriterion(plugin.nssModuleParameters)) {
+    throw BadPlugin(plugin, "has parameters for its service that the C library does not know",
+                    plugin.nssModuleParameters);
+  }
+  return service;
 }
 
 ServiceMeaning ServiceCalled(const std::string& name, const RootFolder& root) {

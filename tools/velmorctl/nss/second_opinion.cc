@@ -57,33 +57,31 @@ bool OthersAreEqual(NSSConfiguration& before, NSSConfiguration& after,
   return true;
 }
 
-/// The model loses what stands behind a criterion.
+/// The model reads a criterion of the only service; among several services it loses some.
 bool CanBeModelled(const Meaning& services) {
-  return std::all_of(services.begin(), services.end(), [&services](const ServiceMeaning& service) {
-    return service.criterion.empty() || &service == &services.back();
-  });
+  return services.size() == 1 ||
+         std::all_of(services.begin(), services.end(),
+                     [](const ServiceMeaning& service) { return service.criterion.empty(); });
 }
 
 }  // namespace
 
 bool ModelAgrees(const SwitchFile& before, const SwitchFile& after, const WantedLine& wanted) {
   std::optional<NSSConfiguration> modelBefore = Read(before.Text());
-  std::optional<NSSConfiguration> modelAfter = Read(after.Text());
   if (!modelBefore) {
     return true;
   }
-  if (!modelAfter) {
-    return false;
-  }
   const std::optional<NSSDatabase> edited = DatabaseCalled(wanted.database);
-  if (!OthersAreEqual(*modelBefore, *modelAfter, edited)) {
-    return false;
-  }
   const std::vector<const SwitchLine*> lines = before.LinesOf(wanted.database);
   const Meaning meaningBefore = lines.empty() ? Meaning() : lines.front()->Meaning();
-  const bool hasOpinion =
+  const bool readsTheLine =
       edited && MeaningOf(*modelBefore, *edited) == meaningBefore && CanBeModelled(wanted.services);
-  return !hasOpinion || MeaningOf(*modelAfter, *edited) == wanted.services;
+  std::optional<NSSConfiguration> modelAfter = Read(after.Text());
+  if (!modelAfter) {
+    return !readsTheLine;
+  }
+  return OthersAreEqual(*modelBefore, *modelAfter, edited) &&
+         (!readsTheLine || MeaningOf(*modelAfter, *edited) == wanted.services);
 }
 
 }  // namespace velmorctl

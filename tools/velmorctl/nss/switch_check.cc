@@ -61,7 +61,8 @@ class Check {
 
   void CheckServices(const SwitchLine& line) {
     if (line.services.empty()) {
-      Add(line, line.database, "the database has no services, so that nothing is found in it",
+      Add(line, line.database,
+          "the database has no services; programs that look something up in it may crash",
           "write services behind the colon, for example files, or remove the line");
       return;
     }

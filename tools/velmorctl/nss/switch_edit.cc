@@ -109,6 +109,15 @@ void RequireLocalStaysFirst(const std::string& shown, const SwitchLine& line, co
   }
 }
 
+/// The C library reads past the end of a list without services.
+void RequireServicesLeft(const std::string& shown, const SwitchLine& line, const Meaning& wanted) {
+  if (wanted.empty() && IsLibraryDatabase(line.database)) {
+    throw Refusal(shown, line, "\"" + line.database + "\" would have no services left",
+                  "programs that look something up in such a database may crash")
+        .Try("add another service first, or remove the whole line by hand");
+  }
+}
+
 /// The text with `insertion` put in, and a blank behind it where a word would follow at once.
 std::string WithInsertion(const std::string& text, std::size_t position, std::string insertion) {
   if (position < text.size() && !IsSpace(text[position]) && !IsSpace(insertion.back())) {
@@ -267,6 +276,7 @@ SwitchEdit RemoveService(const SwitchFile& file, const std::string& shown, const
     return edit;
   }
   RequireLocalStaysFirst(shown, *line, wanted);
+  RequireServicesLeft(shown, *line, wanted);
   ProveEdit(file, SwitchFile(edit.content), shown, {line->number, database, wanted});
   return edit;
 }

@@ -21,8 +21,9 @@ struct SwitchEdit {
 /// old one but for the change that was asked for; SystemConfiguration::NSSConfiguration must agree wherever
 /// it reads the line without loss. `shown` names the file in messages.
 ///
-/// They throw Failure: Usage for a name that cannot be one, a service to stand behind that is not there, and
-/// what would leave local accounts without their files; Configuration when the file has a fault that makes
+/// They throw Failure: Usage for a name that cannot be one, a service to stand behind that is not there,
+/// what would leave local accounts without their files, and what would leave a database of the C library
+/// without services; Configuration when the file has a fault that makes
 /// the change uncertain, or the proof fails.
 
 /// Puts the service behind the one called `after` and what stands in brackets behind that or, when `after` is

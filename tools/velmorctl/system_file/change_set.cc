@@ -52,6 +52,15 @@ Failure AsFailure(const std::exception& cause) {
       .Try("see that the file system is writable and has free space");
 }
 
+/// The backup of a change that was undone; the failure that undid it is what counts.
+void RemoveNeedless(const BackupStore& store, const std::string& backup, Failure& failure) {
+  try {
+    store.Remove(backup);
+  } catch (const Failure& another) {
+    failure.Detail("backup", backup + " stays: " + another.what());
+  }
+}
+
 }  // namespace
 
 ChangeSet::ChangeSet(RootFolder root, std::string kind, std::string command)
@@ -173,7 +182,7 @@ void ChangeSet::UndoAndThrow(std::size_t performed, const BackupStore& store, co
     }
   }
   if (left.empty()) {
-    store.Remove(backup);
+    RemoveNeedless(store, backup, failure);
     throw failure;
   }
   throw failure.Detail("left", Join(left, ", ") + ": not put back")
