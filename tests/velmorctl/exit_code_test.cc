@@ -80,7 +80,8 @@ INSTANTIATE_TEST_SUITE_P(Each, ChangingCommandTest,
                                            std::vector<std::string>{"provider", "use", "ctlscript"},
                                            std::vector<std::string>{"dc", "prefer", "dc1"},
                                            std::vector<std::string>{"smartcard", "set", "login"},
-                                           std::vector<std::string>{"option", "set", "A.b", "1"}),
+                                           std::vector<std::string>{"option", "set", "A.b", "1"},
+                                           std::vector<std::string>{"nss", "add", "passwd", "winbind"}),
                          [](const auto& test) { return test.param[0]; });
 
 class ReadingCommandTest : public PreparedHost,
@@ -97,7 +98,7 @@ INSTANTIATE_TEST_SUITE_P(
     ::testing::Values(std::vector<std::string>{"status"}, std::vector<std::string>{"trust", "show"},
                       std::vector<std::string>{"store", "list"}, std::vector<std::string>{"provider", "show"},
                       std::vector<std::string>{"dc", "show"}, std::vector<std::string>{"smartcard", "list"},
-                      std::vector<std::string>{"option", "get"}),
+                      std::vector<std::string>{"option", "get"}, std::vector<std::string>{"nss", "show"}),
     [](const auto& test) { return test.param[0]; });
 
 TEST_F(ExitCodeTest, IsSeventySevenWhenOnlyRootMayReadAFile) {
