@@ -81,7 +81,10 @@ class SystemdResolver : public ResolverConfiguration {
   void AddSearchDomains(const DomainList& domains) override {
     DomainList own;
     ReadDomains(kOwnPath, &own);
-    own.insert(own.end(), domains.begin(), domains.end());
+    // What stands there already and is not in force was dropped by a file behind it, again and again.
+    const DomainList missing = MissingDomains(domains, own);
+    if (missing.empty()) return;
+    own.insert(own.end(), missing.begin(), missing.end());
     MakeDropInDirectory();
     HostMgmt::ReplaceFile(kOwnPath,
                           "# The DNS search domains that this host was given.\n[Resolve]\nDomains=" +

@@ -17,7 +17,7 @@ namespace {
 constexpr std::chrono::seconds kLongestRun(30);
 constexpr std::chrono::milliseconds kPollInterval(5);
 
-/// What the child process begins with: no signal blocked or ignored, and nothing but /dev/null to talk to.
+/// What the child process begins with: no signal blocked or ignored, and nothing open but /dev/null.
 class SpawnSettings {
  public:
   SpawnSettings() {
@@ -25,6 +25,7 @@ class SpawnSettings {
     posix_spawn_file_actions_addopen(&actions_, 0, "/dev/null", O_RDONLY, 0);
     posix_spawn_file_actions_addopen(&actions_, 1, "/dev/null", O_WRONLY, 0);
     posix_spawn_file_actions_addopen(&actions_, 2, "/dev/null", O_WRONLY, 0);
+    posix_spawn_file_actions_addclosefrom_np(&actions_, 3);
     sigset_t signals;
     posix_spawnattr_init(&attributes_);
     sigemptyset(&signals);

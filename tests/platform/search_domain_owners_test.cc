@@ -126,6 +126,21 @@ TEST_F(SystemdResolverTest, AddingTwiceReloadsOnce) {
   EXPECT_EQ(testsupport::ReadFile(kOwn), OwnFile("corp.example"));
 }
 
+TEST_F(SystemdResolverTest, ADomainThatALaterFileDropsIsWrittenOnce) {
+  testsupport::MakeFolders(kDropIns);
+  testsupport::WriteFile(std::string(kDropIns) + "60-site.conf", "[Resolve]\nDomains=\n");
+  Add();
+  Add();
+  EXPECT_EQ(testsupport::ReadFile(kOwn), OwnFile("corp.example"));
+}
+
+TEST_F(SystemdResolverTest, GetsNoDescriptorOfThisProcess) {
+  StartSystemd("[ ! -e /proc/self/fd/77 ] || echo leaked >> " + kCalls);
+  ASSERT_EQ(dup2(STDOUT_FILENO, 77), 77);
+  Add();
+  EXPECT_EQ(Calls(), kReload);
+}
+
 TEST_F(SystemdResolverTest, IsNotReloadedWhereSystemdDoesNotRun) {
   ReplaceProgram("/usr/bin/systemctl", "true");
   Add();
