@@ -1,5 +1,7 @@
 #include <gtest/gtest.h>
 
+#include <filesystem>
+
 #include "plugins/scripted_plugin.h"
 #include "prepared_host.h"
 
@@ -249,6 +251,16 @@ TEST_F(ProviderTest, WritesTheChoiceIntoAnExistingFileAndKeepsTheRest) {
   EXPECT_EQ(testsupport::ModeOf(PROVIDER_CONF), 0600U);
   EXPECT_EQ(testsupport::NamesIn(testsupport::CONFIGURATION_FOLDER),
             (std::vector<std::string>{"authentication.conf", "provider.conf"}));
+}
+
+TEST_F(ProviderTest, WritesThroughALinkInTheFilesPlace) {
+  const std::string target = "/etc/quenix/provider.conf";
+  WriteFile(target, "");
+  testsupport::RemoveFile(PROVIDER_CONF);
+  std::filesystem::create_symlink(target, PROVIDER_CONF);
+  EXPECT_EQ(Velmorctl({"provider", "use", "ctlscript"}).exitCode, 0);
+  EXPECT_TRUE(std::filesystem::is_symlink(PROVIDER_CONF));
+  EXPECT_EQ(ReadFile(target), "provider = \"ctlscript\"\n");
 }
 
 TEST_F(ProviderTest, MakesTheFileWhenThereIsNone) {

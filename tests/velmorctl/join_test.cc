@@ -1,4 +1,7 @@
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 #include <csignal>
 
@@ -131,6 +134,11 @@ TEST_F(JoinTest, RefusesASecondJoinAtTheSameTime) {
   EXPECT_EQ(first.Wait().exitCode, 0);
 }
 
+TEST_F(JoinTest, LetsOnlyRootHoldItsLock) {
+  ASSERT_EQ(Velmorctl(Join()).exitCode, 0);
+  EXPECT_EQ(testsupport::ModeOf("/run/velmor/velmorctl.lock"), 0600U);
+}
+
 TEST_F(JoinTest, RefusesALeaveAtTheSameTime) {
   RunningProgram join(HangingJoin());
   ASSERT_TRUE(Eventually([] { return Called(JOIN_CALL); }));
@@ -151,6 +159,18 @@ TEST_F(JoinTest, UndoesTheJoinWhenItIsInterrupted) {
   EXPECT_EQ(ActiveStore(), "None");
   EXPECT_NE(outcome.errors.find("the host has left the domain again\n  changed:  nothing"), std::string::npos)
       << outcome.errors;
+}
+
+TEST_F(JoinTest, GoesOnWhenNobodyReadsItsProgress) {
+  const std::string progress = "/run/progress";
+  ASSERT_EQ(mkfifo(progress.c_str(), 0600), 0);
+  const int reader = open(progress.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC);
+  RunningProgram join(HangingJoin(), WithErrorsTo(progress));
+  ASSERT_TRUE(Eventually([] { return Called(JOIN_CALL); }));
+  close(reader);
+  RemoveScript("hang.joinDomain");
+  EXPECT_EQ(join.Wait().exitCode, 0);
+  EXPECT_TRUE(Recorded());
 }
 
 TEST_F(JoinTest, SaysThatTheHostStaysJoinedWhenTheJoinCannotBeUndone) {

@@ -90,6 +90,22 @@ TEST_F(LeaveTest, SaysThatTheHostHasLeftWhenTheRecordCannotBeRemoved) {
       << outcome.errors;
 }
 
+TEST_F(LeaveTest, SaysSoAlsoWhenItIsInterrupted) {
+  Script("hang.partDomain", "");
+  RunningProgram leave(LEAVE_AS_ALICE);
+  ASSERT_TRUE(Eventually([] { return Called("partDomain alice"); }));
+  leave.Signal(SIGINT);
+  ASSERT_TRUE(
+      Eventually([&leave] { return leave.ErrorsSoFar().find("interrupted: ") != std::string::npos; }));
+  DamageRecords();
+  RemoveScript("hang.partDomain");
+  const Outcome outcome = leave.Wait();
+  EXPECT_EQ(outcome.signalNumber, SIGINT);
+  EXPECT_NE(outcome.errors.find("the host has left the domain, but the record of the join is still there"),
+            std::string::npos)
+      << outcome.errors;
+}
+
 }  // namespace
 
 }  // namespace velmorctltest

@@ -1,4 +1,5 @@
 #include <gtest/gtest.h>
+#include <sys/resource.h>
 
 #include <csignal>
 #include <fstream>
@@ -218,6 +219,20 @@ TEST_F(PasswordTest, IsWipedFromMemoryAfterTheJoin) {
   RemoveScript("hang.joinDomain");
   ASSERT_TRUE(Eventually([] { return Called("getDomainTrustState"); }));
   EXPECT_FALSE(MemoryHolds(join.Process(), PASSWORD));
+}
+
+TEST_F(PasswordTest, IsInNoCoreFile) {
+  rlimit size = {};
+  ASSERT_EQ(getrlimit(RLIMIT_CORE, &size), 0);
+  size.rlim_cur = size.rlim_max;
+  ASSERT_EQ(setrlimit(RLIMIT_CORE, &size), 0);
+  Script("hang.joinDomain", "");
+  RunningProgram join(JoinWith({"--password-file", PASSWORD_FILE}));
+  ASSERT_TRUE(Eventually([] { return Called(JOIN_CALL); }));
+  join.Signal(SIGQUIT);
+  const Outcome outcome = join.Wait();
+  EXPECT_EQ(outcome.signalNumber, SIGQUIT);
+  EXPECT_FALSE(outcome.leftCoreFile);
 }
 
 TEST_F(PasswordTest, StandsInNoMessage) {

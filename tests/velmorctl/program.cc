@@ -32,6 +32,7 @@ Outcome OutcomeOf(int status) {
     outcome.exitCode = WEXITSTATUS(status);
   } else {
     outcome.signalNumber = WTERMSIG(status);
+    outcome.leftCoreFile = WCOREDUMP(status);
   }
   return outcome;
 }
@@ -62,6 +63,12 @@ Setting WithOutputTo(const std::string& path) {
   return setting;
 }
 
+Setting WithErrorsTo(const std::string& path) {
+  Setting setting;
+  setting.errorsTo = path;
+  return setting;
+}
+
 Setting WithoutRoot() {
   Setting setting;
   setting.asRoot = false;
@@ -83,7 +90,9 @@ void BecomeProgram(const std::vector<std::string>& arguments, bool asRoot) {
 }
 
 RunningProgram::RunningProgram(const std::vector<std::string>& arguments, const Setting& setting)
-    : files_(NewFiles()), output_(setting.outputTo.empty() ? files_ + ".out" : setting.outputTo) {
+    : files_(NewFiles()),
+      output_(setting.outputTo.empty() ? files_ + ".out" : setting.outputTo),
+      errors_(setting.errorsTo.empty() ? files_ + ".err" : setting.errorsTo) {
   testsupport::WriteFile(files_ + ".in", setting.standardInput);
   for (std::size_t index = 0; index < setting.descriptorContents.size(); ++index) {
     testsupport::WriteFile(files_ + ".fd" + std::to_string(index), setting.descriptorContents[index]);
@@ -95,7 +104,7 @@ RunningProgram::RunningProgram(const std::vector<std::string>& arguments, const 
   if (process_ == 0) {
     Redirect(files_ + ".in", O_RDONLY, STDIN_FILENO);
     Redirect(output_, O_WRONLY | O_CREAT, STDOUT_FILENO);
-    Redirect(files_ + ".err", O_WRONLY | O_CREAT | O_APPEND, STDERR_FILENO);
+    Redirect(errors_, O_WRONLY | O_CREAT | O_APPEND, STDERR_FILENO);
     for (std::size_t index = 0; index < setting.descriptorContents.size(); ++index) {
       Redirect(files_ + ".fd" + std::to_string(index), O_RDONLY, firstDescriptor + static_cast<int>(index));
     }
@@ -116,8 +125,7 @@ void RunningProgram::Signal(int number) const {
 }
 
 std::string RunningProgram::ErrorsSoFar() const {
-  const std::string path = files_ + ".err";
-  return testsupport::Exists(path) ? testsupport::ReadFile(path) : "";
+  return testsupport::Exists(errors_) ? testsupport::ReadFile(errors_) : "";
 }
 
 Outcome RunningProgram::Wait() {
@@ -129,7 +137,9 @@ Outcome RunningProgram::Wait() {
   if (output_ == files_ + ".out") {
     outcome.output = testsupport::ReadFile(output_);
   }
-  outcome.errors = testsupport::ReadFile(files_ + ".err");
+  if (errors_ == files_ + ".err") {
+    outcome.errors = testsupport::ReadFile(errors_);
+  }
   return outcome;
 }
 

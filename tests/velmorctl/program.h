@@ -16,6 +16,7 @@ namespace velmorctltest {
 struct Outcome {
   int exitCode = -1;     /// -1 when a signal ended it
   int signalNumber = 0;  /// 0 when it exited
+  bool leftCoreFile = false;
   std::string output;
   std::string errors;
 
@@ -28,12 +29,14 @@ struct Setting {
   std::string standardInput;                    /// the whole of it
   std::vector<std::string> descriptorContents;  /// of the descriptors 10, 11, ... that the command inherits
   std::string outputTo;                         /// where standard output goes instead of into the outcome
+  std::string errorsTo;                         /// the same for standard error
   bool asRoot = true;
 };
 
 Setting WithInput(const std::string& standardInput);
 Setting WithDescriptor(const std::string& content);
 Setting WithOutputTo(const std::string& path);
+Setting WithErrorsTo(const std::string& path);
 Setting WithoutRoot();
 
 /// A command that runs; killed when this object ends before it does.
@@ -58,6 +61,7 @@ class RunningProgram {
   bool ended_ = false;
   std::string files_;
   std::string output_;
+  std::string errors_;
 };
 
 /// Runs the command to its end.

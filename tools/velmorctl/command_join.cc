@@ -10,7 +10,9 @@
 #include "operation_lock.h"
 #include "password_source.h"
 #include "progress.h"
+#include "secret.h"
 #include "settings_file.h"
+#include "signal_pipe.h"
 #include "text.h"
 #include "trust_names.h"
 #include "watched_call.h"
@@ -162,6 +164,8 @@ void RequireTarget(const Options& options) {
 ExitCode Join(const Options& options, Situation& situation) {
   RequireRoot("join a domain");
   RequireTarget(options);
+  ForbidCoreFiles();
+  IgnoreBrokenPipes();
   situation.doing = "join " + options.Description();
   situation.throughProxy = options.ThroughProxy();
   WatchHostFiles(situation);

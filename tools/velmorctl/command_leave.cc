@@ -10,7 +10,9 @@
 #include "orvconfigstore/config_store_exception.h"
 #include "password_source.h"
 #include "progress.h"
+#include "secret.h"
 #include "settings_file.h"
+#include "signal_pipe.h"
 #include "text.h"
 #include "watched_call.h"
 
@@ -40,6 +42,21 @@ std::shared_ptr<Account> ReadAccount(const Options& options) {
   return account;
 }
 
+/// For a leave that was to be interrupted.
+std::string HowItEnded(const std::exception_ptr& failure) {
+  if (!failure) {
+    return "the host has left the domain";
+  }
+  try {
+    std::rethrow_exception(failure);
+  } catch (const OrvConfigStore::ConfigStoreException& exception) {
+    return std::string("the host has left the domain, but the record of the join is still there: ") +
+           exception.what();
+  } catch (const std::exception& exception) {
+    return std::string("the leave had failed by then: ") + exception.what();
+  }
+}
+
 /// The library's leave with an account keeps the record of the join, so that is removed here.
 void LeaveThroughStore(Directory& directory, const std::shared_ptr<Account>& account, Progress& progress) {
   SignalPipe signals{SIGINT, SIGTERM, SIGHUP};
@@ -54,8 +71,7 @@ void LeaveThroughStore(Directory& directory, const std::shared_ptr<Account>& acc
   CallOutcome outcome = RunWatched(
       leave, progress, signals, "interrupted: a leave is not undone, and ends first (again: leave at once)");
   if (outcome.signalNumber) {
-    throw Interrupted(*outcome.signalNumber,
-                      outcome.failure ? "the leave had failed by then" : "the host has left the domain");
+    throw Interrupted(*outcome.signalNumber, HowItEnded(outcome.failure));
   }
   if (outcome.failure) {
     std::rethrow_exception(outcome.failure);
@@ -82,6 +98,8 @@ void PrintEnd(const std::string& domain) {
 
 ExitCode Leave(const Options& options, Situation& situation) {
   RequireRoot("leave a domain");
+  ForbidCoreFiles();
+  IgnoreBrokenPipes();
   situation.doing = "leave the domain";
   OperationLock lock;
   Directory directory(answerTimeout);

@@ -37,7 +37,8 @@ void WriteHolder(int descriptor) {
 
 OperationLock::OperationLock() {
   mkdir(directory, 0755);
-  descriptor_ = open(file, O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0644);
+  // Whoever may read it may lock it, and so keep root from joining and leaving.
+  descriptor_ = open(file, O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600);
   if (descriptor_ < 0) {
     throw Failure(ExitCode::HostNotReady,
                   std::string("cannot open '") + file + "': " + SystemErrorText(errno))

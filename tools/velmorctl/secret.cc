@@ -1,6 +1,7 @@
 #include "secret.h"
 
 #include <sys/mman.h>
+#include <sys/prctl.h>
 
 #include <cstring>
 #include <new>
@@ -47,6 +48,10 @@ void Secret::RemoveLast() {
 void Secret::Clear() {
   explicit_bzero(memory_, mappedBytes);
   length_ = 0;
+}
+
+void ForbidCoreFiles() {
+  prctl(PR_SET_DUMPABLE, 0, 0, 0, 0);
 }
 
 }  // namespace velmorctl

@@ -32,6 +32,9 @@ class Secret {
   std::size_t length_ = 0;
 };
 
+/// Keeps the memory of this process out of core files: a provider, too, holds the secret that it is given.
+void ForbidCoreFiles();
+
 }  // namespace velmorctl
 
 #endif  // VELMORCTL_SECRET_H

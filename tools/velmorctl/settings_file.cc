@@ -1,12 +1,10 @@
 #include "settings_file.h"
 
 #include <fcntl.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <algorithm>
 #include <cerrno>
-#include <cstdlib>
 #include <filesystem>
 #include <fstream>
 #include <string_view>
@@ -14,6 +12,8 @@
 #include <vector>
 
 #include "authentication/authentication_store_factory.h"
+#include "hostmgmt/host_management_exception.h"
+#include "hostmgmt/replace_file.h"
 #include "text.h"
 
 namespace velmorctl {
@@ -142,73 +142,6 @@ class Inspection {
   std::string value_;
 };
 
-[[noreturn]] void ThrowSystemError(const std::string& what) {
-  int errorNumber = errno;
-  throw Failure(ExitCode::Configuration, what + ": " + SystemErrorText(errorNumber))
-      .Try("make the directory writable, with free space");
-}
-
-/// A file beside the one that it will replace; removed unless it was renamed.
-class Replacement {
- public:
-  explicit Replacement(const std::string& path) : path_(path), temporaryPath_(path + ".XXXXXX") {
-    descriptor_ = mkostemp(temporaryPath_.data(), O_CLOEXEC);
-    if (descriptor_ < 0) {
-      ThrowSystemError("cannot make a file beside '" + path + "'");
-    }
-  }
-  Replacement(const Replacement&) = delete;
-  Replacement& operator=(const Replacement&) = delete;
-
-  ~Replacement() {
-    close(descriptor_);
-    if (!temporaryPath_.empty()) {
-      unlink(temporaryPath_.c_str());
-    }
-  }
-
-  void Write(std::string_view text) {
-    while (!text.empty()) {
-      ssize_t written = write(descriptor_, text.data(), text.size());
-      if (written < 0) {
-        ThrowSystemError("cannot write '" + temporaryPath_ + "'");
-      }
-      text.remove_prefix(static_cast<std::size_t>(written));
-    }
-  }
-
-  void Commit() {
-    struct stat previous = {};
-    bool existed = stat(path_.c_str(), &previous) == 0;
-    if ((existed && fchown(descriptor_, previous.st_uid, previous.st_gid) != 0) ||
-        fchmod(descriptor_, existed ? previous.st_mode & 07777 : 0644) != 0 || fsync(descriptor_) != 0 ||
-        rename(temporaryPath_.c_str(), path_.c_str()) != 0) {
-      ThrowSystemError("cannot replace '" + path_ + "'");
-    }
-    temporaryPath_.clear();
-    SyncDirectory();
-  }
-
- private:
-  void SyncDirectory() const {
-    std::string directory = std::filesystem::path(path_).parent_path();
-    int descriptor = open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-    bool synced = descriptor >= 0 && fsync(descriptor) == 0;
-    int errorNumber = errno;
-    if (descriptor >= 0) {
-      close(descriptor);
-    }
-    if (!synced) {
-      errno = errorNumber;
-      ThrowSystemError("'" + path_ + "' was replaced, but a power cut may bring the old one back");
-    }
-  }
-
-  std::string path_;
-  std::string temporaryPath_;
-  int descriptor_;
-};
-
 }  // namespace
 
 SettingsInspection InspectSettingsFile(const std::string& path, const std::string& key,
@@ -251,11 +184,16 @@ SettingsInspection InspectProviderFile() {
 void ReplaceSettingsFile(const std::string& path, const std::map<std::string, std::string>& entries) {
   std::error_code error;
   std::filesystem::create_directories(std::filesystem::path(path).parent_path(), error);
-  Replacement replacement(path);
+  std::string content;
   for (const auto& [key, value] : entries) {
-    replacement.Write(key + " = \"" + value + "\"\n");
+    content += key + " = \"" + value + "\"\n";
   }
-  replacement.Commit();
+  try {
+    HostMgmt::ReplaceFile(path, content);
+  } catch (const HostMgmt::Lib::HostMgmtException& exception) {
+    throw Failure(ExitCode::Configuration, exception.what())
+        .Try("make the directory writable, with free space");
+  }
 }
 
 }  // namespace velmorctl

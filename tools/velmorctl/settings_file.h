@@ -33,9 +33,10 @@ SettingsInspection InspectAuthenticationFile();
 /// The same for provider.conf.
 SettingsInspection InspectProviderFile();
 
-/// Replaces the file by the entries, in the library's format: durably, and at once for every reader. Owner
-/// and permissions stay; a new file can be read by everybody, since nothing in it is secret. Makes the
-/// directory when it is missing. Throws Failure; the file is then as it was.
+/// Replaces the file by the entries, in the library's format: durably, and at once for every reader. Owner,
+/// permissions and attributes stay, and so does a link in the file's place; a new file can be read by
+/// everybody, since nothing in it is secret. Makes the directory when it is missing. Throws Failure; the file
+/// is then as it was.
 void ReplaceSettingsFile(const std::string& path, const std::map<std::string, std::string>& entries);
 
 }  // namespace velmorctl

@@ -63,4 +63,8 @@ std::optional<int> SignalPipe::Take() {
   return byte;
 }
 
+void IgnoreBrokenPipes() {
+  signal(SIGPIPE, SIG_IGN);
+}
+
 }  // namespace velmorctl

@@ -35,6 +35,9 @@ class SignalPipe {
   std::vector<std::pair<int, struct sigaction>> previousActions_;
 };
 
+/// Lets nobody who stops reading what the command writes break it off.
+void IgnoreBrokenPipes();
+
 }  // namespace velmorctl
 
 #endif  // VELMORCTL_SIGNAL_PIPE_H
