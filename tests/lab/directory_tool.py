@@ -13,6 +13,7 @@ from samba.param import LoadParm
 from samba.samdb import SamDB
 
 ACCOUNT_DISABLED = 0x2
+CONTROLLERS_ACCOUNT = 0x82000
 
 parameters = LoadParm()
 parameters.load_default()
@@ -58,11 +59,18 @@ def create_computer(name, dns_name, unit=None):
     set_computer_dns_name(name, dns_name)
 
 
+def make_controllers_account(name):
+    change = ldb.Message(find(f"{name}$").dn)
+    change["userAccountControl"] = ldb.MessageElement(str(CONTROLLERS_ACCOUNT), ldb.FLAG_MOD_REPLACE,
+                                                      "userAccountControl")
+    directory.modify(change)
+
+
 def bad_password_count(user):
     return int(str(find(user).get("badPwdCount", "0")))
 
 
 answers = {function.__name__.replace("_", "-"): function for function in (
     computer, delete_computer, disable_computer, reset_computer_password, set_computer_dns_name, create_computer,
-    bad_password_count)}
+    make_controllers_account, bad_password_count)}
 print(json.dumps(answers[sys.argv[1]](*sys.argv[2:])))

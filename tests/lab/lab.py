@@ -8,6 +8,7 @@ import fcntl
 import json
 import os
 import pathlib
+import re
 import subprocess
 import time
 import typing
@@ -151,6 +152,14 @@ class Host:
                             "-printf '%p %m %u:%g ' -exec sha256sum '{}' ';' | sort")
         return {line.split(" ", 1)[0]: line for line in listing.splitlines()}
 
+    def changes_since(self, before):
+        """The files that are not as they were in `before`, but for the provider's record, Samba's databases and
+        what winbindd has in /run."""
+        after = self.files()
+        changed = {path for path in before.keys() | after.keys() if before.get(path) != after.get(path)}
+        expected = re.compile(r"/var/lib/quenix/samba/(attempts\.log|lock)|/var/lib/samba/.*\.tdb|/run/samba/.*")
+        return {path for path in changed if not expected.fullmatch(path)}
+
 
 class Directory:
     """CORP.EXAMPLE as its controller dc1 sees it, past all network protocols."""
@@ -182,6 +191,9 @@ class Directory:
     def create_computer(self, name, dns_name, *unit):
         """Makes an account; `unit` is where, without the domain's part, if not in the default place."""
         self._ask("create-computer", name, dns_name, *unit)
+
+    def make_controllers_account(self, name):
+        self._ask("make-controllers-account", name)
 
     def bad_password_count(self, user):
         return self._ask("bad-password-count", user)

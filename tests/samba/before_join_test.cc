@@ -3,6 +3,8 @@
 #include "helper/before_join.h"
 
 #include <gtest/gtest.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 #include "common/paths.h"
 #include "common/smb_conf.h"
@@ -32,8 +34,34 @@ TEST_F(BeforeJoinTest, FilesThatWereThereAreGivenBack) {
   before_join::GiveBack();
   EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "before");
   EXPECT_EQ(testsupport::ReadFile(paths::kKeytab), std::string("\x05\x02\0k", 4));
-  EXPECT_EQ(testsupport::ModeOf(paths::kSmbConf), 0644U);
-  EXPECT_EQ(testsupport::ModeOf(paths::kKeytab), 0600U);
+}
+
+TEST_F(BeforeJoinTest, FilesGetTheirModesBack) {
+  testsupport::WriteFile(paths::kSmbConf, "before");
+  testsupport::SetMode(paths::kSmbConf, 0640);
+  testsupport::WriteFile(paths::kKeytab, "key");
+  testsupport::SetMode(paths::kKeytab, 0440);
+  before_join::PutAside();
+  WriteSmbConf("ours");
+  testsupport::RemoveFile(paths::kKeytab);
+  before_join::GiveBack();
+  EXPECT_EQ(testsupport::ModeOf(paths::kSmbConf), 0640U);
+  EXPECT_EQ(testsupport::ModeOf(paths::kKeytab), 0440U);
+}
+
+TEST_F(BeforeJoinTest, FilesGetTheirOwnersBack) {
+  testsupport::WriteFile(paths::kKeytab, "key");
+  // Not every sandbox may give files away; the owner is kept in any case.
+  static_cast<void>(!chown(paths::kKeytab, 12, 34));
+  struct stat before {};
+  ASSERT_EQ(stat(paths::kKeytab, &before), 0);
+  before_join::PutAside();
+  testsupport::RemoveFile(paths::kKeytab);
+  before_join::GiveBack();
+  struct stat after {};
+  ASSERT_EQ(stat(paths::kKeytab, &after), 0);
+  EXPECT_EQ(after.st_uid, before.st_uid);
+  EXPECT_EQ(after.st_gid, before.st_gid);
 }
 
 TEST_F(BeforeJoinTest, FilesThatWereNotThereAreRemoved) {
@@ -64,10 +92,8 @@ TEST_F(BeforeJoinTest, GivingBackTwiceIsTheSameAsOnce) {
 }
 
 TEST_F(BeforeJoinTest, TheCopiesAreForRootOnly) {
-  testsupport::WriteFile(paths::kKeytab, "key");
   before_join::PutAside();
   EXPECT_EQ(testsupport::ModeOf(paths::kBeforeFolder), 0700U);
-  EXPECT_EQ(testsupport::ModeOf(std::string(paths::kBeforeFolder) + "/krb5.keytab"), 0600U);
 }
 
 TEST_F(BeforeJoinTest, DroppedCopiesAreGone) {

@@ -36,6 +36,17 @@ TEST(GeneralizedTimeTest, AnythingElseIsRefused) {
   EXPECT_FAILURE(ParseGeneralizedTime("tomorrow"), 1359);
 }
 
+TEST(ControllersAccountTest, ItIsKnownByItsFlags) {
+  EXPECT_TRUE(IsControllersAccount("532480"));
+  EXPECT_TRUE(IsControllersAccount("83890176"));
+}
+
+TEST(ControllersAccountTest, AMembersAccountIsNone) {
+  EXPECT_FALSE(IsControllersAccount("4096"));
+  EXPECT_FALSE(IsControllersAccount("4098"));
+  EXPECT_FALSE(IsControllersAccount(""));
+}
+
 TEST(DirectoryTest, AControllerThatDoesNotAnswerIsReportedAsSuch) {
   Directory directory("127.0.0.1", std::chrono::seconds(5));
   EXPECT_FAILURE(directory.ReadRootEntry(), 1311);

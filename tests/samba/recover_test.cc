@@ -13,6 +13,7 @@ extern "C" {
 #include "helper/before_join.h"
 #include "helper/journal.h"
 #include "helper/operations.h"
+#include "helper/undo.h"
 #include "support/files.h"
 
 namespace sambaprovider {
@@ -75,6 +76,19 @@ TEST_F(RecoverTest, AnInterruptedJoinIsTakenBack) {
   EXPECT_FALSE(testsupport::Exists(paths::kKeytab));
   EXPECT_FALSE(testsupport::Exists(paths::kJournal));
   EXPECT_FALSE(testsupport::Exists(paths::kBeforeFolder));
+}
+
+TEST_F(RecoverTest, AJoinThatIsTakenBackIsForgotten) {
+  before_join::PutAside();
+  const Journal journal{Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", false};
+  SaveJournal(journal);
+  // Saving the state can fail after the file has got its new content.
+  SaveJoined();
+  UndoJoin(log_, journal, nullptr);
+  EXPECT_FALSE(LoadState().joined);
+  EXPECT_EQ(LoadState().dnsDomain, "");
+  EXPECT_EQ(LoadState().smartCardEnabledServices, std::vector<std::string>{"sshd"});
+  EXPECT_FALSE(testsupport::Exists(paths::kJournal));
 }
 
 TEST_F(RecoverTest, AJoinThatHadRememberedItsDomainIsKept) {

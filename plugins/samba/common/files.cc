@@ -29,6 +29,25 @@ void FlushFolderOf(const std::string& path) {
   if (!folder.IsOpen() || fsync(folder.Get()) != 0) Fail("flush the folder of", path, errno);
 }
 
+// Nothing is open when there is no such file.
+UniqueFd OpenWhenThere(const std::string& path) {
+  UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
+  if (!file.IsOpen() && errno != ENOENT) Fail("read", path, errno);
+  return file;
+}
+
+std::string ReadAll(int descriptor, const std::string& path) {
+  std::string content;
+  char buffer[8192];
+  for (;;) {
+    const ssize_t count = read(descriptor, buffer, sizeof buffer);
+    if (count < 0 && errno == EINTR) continue;
+    if (count < 0) Fail("read", path, errno);
+    if (count == 0) return content;
+    content.append(buffer, static_cast<size_t>(count));
+  }
+}
+
 void WriteAll(int descriptor, std::string_view content, const std::string& path) {
   while (!content.empty()) {
     const ssize_t written = write(descriptor, content.data(), content.size());
@@ -52,9 +71,12 @@ class TemporaryFile {
   }
 
   int Descriptor() const { return descriptor_.Get(); }
-  void RenameTo(const std::string& target) {
+  // Durably.
+  void Place(const std::string& target) {
+    if (fsync(descriptor_.Get()) != 0) Fail("flush", target, errno);
     if (rename(path_.c_str(), target.c_str()) != 0) Fail("replace", target, errno);
     renamed_ = true;
+    FlushFolderOf(target);
   }
 
  private:
@@ -71,29 +93,31 @@ std::string ErrorText(int error) {
 }
 
 std::optional<std::string> ReadFile(const std::string& path) {
-  const UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
-  if (!file.IsOpen()) {
-    if (errno == ENOENT) return std::nullopt;
-    Fail("read", path, errno);
-  }
-  std::string content;
-  char buffer[8192];
-  for (;;) {
-    const ssize_t count = read(file.Get(), buffer, sizeof buffer);
-    if (count < 0 && errno == EINTR) continue;
-    if (count < 0) Fail("read", path, errno);
-    if (count == 0) return content;
-    content.append(buffer, static_cast<size_t>(count));
-  }
+  const UniqueFd file = OpenWhenThere(path);
+  if (!file.IsOpen()) return std::nullopt;
+  return ReadAll(file.Get(), path);
 }
 
 void ReplaceFile(const std::string& path, std::string_view content, mode_t mode) {
   TemporaryFile temporary(path);
   WriteAll(temporary.Descriptor(), content, path);
   if (fchmod(temporary.Descriptor(), mode) != 0) Fail("set the mode of", path, errno);
-  if (fsync(temporary.Descriptor()) != 0) Fail("flush", path, errno);
-  temporary.RenameTo(path);
-  FlushFolderOf(path);
+  temporary.Place(path);
+}
+
+bool CopyFile(const std::string& from, const std::string& to) {
+  const UniqueFd file = OpenWhenThere(from);
+  if (!file.IsOpen()) return false;
+  struct stat original = {};
+  if (fstat(file.Get(), &original) != 0) Fail("read", from, errno);
+  TemporaryFile temporary(to);
+  WriteAll(temporary.Descriptor(), ReadAll(file.Get(), from), to);
+  // The mode comes last, since a change of owner takes some of its bits away.
+  if (fchown(temporary.Descriptor(), original.st_uid, original.st_gid) != 0)
+    Fail("set the owner of", to, errno);
+  if (fchmod(temporary.Descriptor(), original.st_mode & 07777) != 0) Fail("set the mode of", to, errno);
+  temporary.Place(to);
+  return true;
 }
 
 void RemoveFile(const std::string& path) {

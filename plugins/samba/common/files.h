@@ -21,6 +21,10 @@ std::optional<std::string> ReadFile(const std::string& path);
 /// Replaces a file through a temporary one beside it and a rename; data and folder are flushed to disk.
 void ReplaceFile(const std::string& path, std::string_view content, mode_t mode);
 
+/// Replaces `to` by a copy of `from`, durably, with its owner, group and mode. Returns false, and does
+/// nothing, when there is no file to copy.
+bool CopyFile(const std::string& from, const std::string& to);
+
 /// Removes a file and flushes its folder; one that does not exist is no failure.
 void RemoveFile(const std::string& path);
 

@@ -18,16 +18,8 @@ const std::string kSmbConfCopy = CopyOf("smb.conf");
 const std::string kKeytabCopy = CopyOf("krb5.keytab");
 const std::string kServiceMark = CopyOf("winbindd-was-running");
 
-void Copy(const std::string& from, const std::string& to) {
-  if (const auto content = ReadFile(from)) ReplaceFile(to, *content, 0600);
-}
-
-void GiveBack(const std::string& copy, const std::string& to, mode_t mode) {
-  if (const auto content = ReadFile(copy)) {
-    ReplaceFile(to, *content, mode);
-  } else {
-    RemoveFile(to);
-  }
+void GiveBack(const std::string& copy, const std::string& to) {
+  if (!CopyFile(copy, to)) RemoveFile(to);
 }
 
 bool SmbConfIsAdministrators() {
@@ -40,15 +32,15 @@ bool SmbConfIsAdministrators() {
 void PutAside() {
   DropCopies();
   MakeFolder(paths::kBeforeFolder, 0700);
-  Copy(paths::kSmbConf, kSmbConfCopy);
-  Copy(paths::kKeytab, kKeytabCopy);
+  CopyFile(paths::kSmbConf, kSmbConfCopy);
+  CopyFile(paths::kKeytab, kKeytabCopy);
   if (winbind_service::IsRunning()) ReplaceFile(kServiceMark, "", 0600);
 }
 
 void GiveBack() {
   if (!FileExists(paths::kBeforeFolder)) return;
-  if (!SmbConfIsAdministrators()) GiveBack(kSmbConfCopy, paths::kSmbConf, 0644);
-  GiveBack(kKeytabCopy, paths::kKeytab, 0600);
+  if (!SmbConfIsAdministrators()) GiveBack(kSmbConfCopy, paths::kSmbConf);
+  GiveBack(kKeytabCopy, paths::kKeytab);
 }
 
 bool ServiceWasRunning() {

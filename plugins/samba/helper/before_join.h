@@ -4,8 +4,8 @@
 
 namespace sambaprovider::before_join {
 
-/// Puts copies of smb.conf and the keytab aside, durably, and notes whether winbindd runs. What was put aside
-/// earlier is dropped. Throws Failure (kInternalError).
+/// Puts copies of smb.conf and the keytab aside, durably, with their owners and modes, and notes whether
+/// winbindd runs. What was put aside earlier is dropped. Throws Failure (kInternalError).
 void PutAside();
 
 /// Gives both files back; those that did not exist are removed. An smb.conf that an administrator has written

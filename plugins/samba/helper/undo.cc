@@ -39,6 +39,23 @@ std::string RemoveSecrets() {
   }
 }
 
+void ForgetMembership(State* state) {
+  state->joined = false;
+  state->dnsDomain.clear();
+  state->netbiosDomain.clear();
+  state->hostName.clear();
+  state->machineAccountDn.clear();
+}
+
+// Saving the state may have reported a failure and been done all the same.
+std::string ForgetJoin() {
+  State state = LoadState();
+  if (!state.joined) return "the domain was not remembered yet";
+  ForgetMembership(&state);
+  SaveState(state);
+  return "the domain is forgotten";
+}
+
 bool SmbConfIsOurs() {
   return OwnerOfSmbConf(ReadFile(paths::kSmbConf), ReadFile(paths::kWrittenSmbConf), std::nullopt) ==
          SmbConfOwner::kProvider;
@@ -53,6 +70,8 @@ void RestoreService() {
 
 void UndoJoin(const AttemptLog& log, const Journal& journal, const UndoAccount* account) {
   log.Begin(kStep, "taking the join of " + journal.dnsDomain + " back");
+  // First, since a run after a crash takes a join for whole that is remembered.
+  const bool forgotten = Try(log, ForgetJoin);
   // libnetapi finds the secrets by the domain in smb.conf, so this comes before smb.conf is given back.
   if (SmbConfIsOurs()) Try(log, RemoveSecrets);
   if (journal.accountIsNew && account != nullptr) {
@@ -69,12 +88,12 @@ void UndoJoin(const AttemptLog& log, const Journal& journal, const UndoAccount* 
     RestoreService();
     return before_join::ServiceWasRunning() ? "winbindd runs as before" : "winbindd is stopped as before";
   });
-  if (restored) {
+  const bool done = forgotten && restored;
+  if (done) {
     RemoveJournal();
     before_join::DropCopies();
   }
-  log.End(kStep, kSuccess,
-          restored ? "the host is as it was before" : "the rest is tried again at the next run");
+  log.End(kStep, kSuccess, done ? "the host is as it was before" : "the rest is tried again at the next run");
 }
 
 void FinishLeave(const AttemptLog& log) {
@@ -84,11 +103,7 @@ void FinishLeave(const AttemptLog& log) {
   });
   log.Run("state", "forgetting the domain", [] {
     State state = LoadState();
-    state.joined = false;
-    state.dnsDomain.clear();
-    state.netbiosDomain.clear();
-    state.hostName.clear();
-    state.machineAccountDn.clear();
+    ForgetMembership(&state);
     state.preferredDomainControllers.clear();
     SaveState(state);
     return "the host has joined no domain";

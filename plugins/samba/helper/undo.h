@@ -16,9 +16,9 @@ struct UndoAccount {
   const Secret& password;
 };
 
-/// Takes a join back as far as it got: machine secrets, computer account when the join made it and `account`
-/// is not null, smb.conf, keytab, winbindd. Goes on when a part fails and records it; the journal stays when
-/// the host's own files could not be restored, so that the next run tries again.
+/// Takes a join back as far as it got: remembered domain, machine secrets, computer account when the join
+/// made it and `account` is not null, smb.conf, keytab, winbindd. Goes on when a part fails and records it;
+/// the journal stays when the host's own files could not be restored, so that the next run tries again.
 void UndoJoin(const AttemptLog& log, const Journal& journal, const UndoAccount* account);
 
 /// The part of a leave after the machine's secrets are gone; may be done again. Throws Failure.

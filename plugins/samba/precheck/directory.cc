@@ -2,6 +2,7 @@
 
 #include <sasl/sasl.h>
 
+#include <charconv>
 #include <ctime>
 #include <memory>
 #include <optional>
@@ -86,6 +87,15 @@ int AnswerNothing(LDAP* /*connection*/, unsigned int /*flags*/, void* /*defaults
 
 }  // namespace
 
+bool IsControllersAccount(const std::string& userAccountControl) {
+  constexpr uint32_t kServerTrustAccount = 0x2000;
+  constexpr uint32_t kPartialSecretsAccount = 0x4000000;  // of a read-only controller
+  int32_t flags = 0;
+  const char* const end = userAccountControl.data() + userAccountControl.size();
+  if (std::from_chars(userAccountControl.data(), end, flags).ptr != end) return false;
+  return (static_cast<uint32_t>(flags) & (kServerTrustAccount | kPartialSecretsAccount)) != 0;
+}
+
 int64_t ParseGeneralizedTime(const std::string& text) {
   tm parts = {};
   const char* end = strptime(text.c_str(), "%Y%m%d%H%M%S", &parts);
@@ -144,10 +154,12 @@ std::string Directory::NetbiosName(const RootEntry& root) {
 
 ComputerAccount Directory::FindComputer(const RootEntry& root, const std::string& computer) {
   const auto message = Search(connection_, root.baseDn, LDAP_SCOPE_SUBTREE,
-                              "(&(objectClass=computer)(sAMAccountName=" + computer + "$))", "dNSHostName");
+                              "(&(objectClass=computer)(sAMAccountName=" + computer + "$))", "dNSHostName",
+                              "userAccountControl");
   LDAPMessage* entry = message ? ldap_first_entry(connection_, message->get()) : nullptr;
   if (entry == nullptr) return {};
-  return {NameOf(connection_, entry), Value(connection_, entry, "dNSHostName")};
+  return {NameOf(connection_, entry), Value(connection_, entry, "dNSHostName"),
+          IsControllersAccount(Value(connection_, entry, "userAccountControl"))};
 }
 
 bool Directory::Exists(const std::string& dn) {

@@ -21,7 +21,11 @@ struct RootEntry {
 struct ComputerAccount {
   std::string dn;  // empty when there is no such account
   std::string dnsHostName;
+  bool isController = false;
 };
+
+/// Whether these flags, in decimal digits as LDAP gives them, are those of a domain controller's account.
+bool IsControllersAccount(const std::string& userAccountControl);
 
 /// Parses LDAP's "20261121010203.0Z" to seconds since 1970. Throws Failure (kInternalError).
 int64_t ParseGeneralizedTime(const std::string& text);

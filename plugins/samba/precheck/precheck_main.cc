@@ -94,8 +94,15 @@ class Precheck {
                                  " seconds; at most " + std::to_string(kLargestSkew) + " are allowed");
   }
 
-  nlohmann::json Remove() {
+  // The account of a controller is never the host's own, whatever DNS name it has.
+  ComputerAccount FindAccount() {
     const ComputerAccount account = directory_->FindComputer(root_, request_.Text("computer"));
+    if (!account.isController) return account;
+    throw Failure(kAccountExists, account.dn + " is the account of a domain controller");
+  }
+
+  nlohmann::json Remove() {
+    const ComputerAccount account = FindAccount();
     std::string text = "there is no computer account to remove";
     if (!account.dn.empty()) {
       if (!account.dnsHostName.empty() &&
@@ -109,7 +116,7 @@ class Precheck {
   }
 
   nlohmann::json Inspect() {
-    const ComputerAccount account = directory_->FindComputer(root_, request_.Text("computer"));
+    const ComputerAccount account = FindAccount();
     return {{"status", kSuccess},
             {"text",
              controller_ + " accepts the password; its clock differs by " + std::to_string(offset_) + " s"},
