@@ -117,6 +117,11 @@ class UnpluggedControllerTest(Outage):
                     cls.leave = cls.stranger.velmorctl("leave")
                     cls.status_after_leave = cls.stranger.velmorctl("status")
                     cls.state_in_outage = state.result()
+                # A winbindd that is started now has nobody to ask which domains are trusted.
+                cls.member.must("sh", "-c", "kill $(cat /run/samba/winbindd.pid); while pgrep -x winbindd; "
+                                "do sleep 0.1; done; exec winbindd -D </dev/null >/dev/null 2>&1")
+                cls.list_in_outage = cls.member.velmorctl("trust", "list")
+                cls.relationship_in_outage = cls.member.velmorctl("trust", "show", "other.example")
             finally:
                 cls.lab.command("link", "dc1", "up")
             cls.seconds_to_recover = store.ask_until("trust-state", HEALTHY, 120)
@@ -124,6 +129,13 @@ class UnpluggedControllerTest(Outage):
     def testTrustIsNotHealthyMeanwhile(self):
         self.assertEqual(self.state_before.text, HEALTHY)
         self.assertNotEqual(self.state_in_outage.text, HEALTHY)
+
+    def testUnknownTrustedDomainsAreNotCalledNone(self):
+        self.assert_exit(self.list_in_outage, 8)
+        self.assertIn("status:   1311", self.list_in_outage.stderr)
+
+    def testUnknownRelationshipIsNotCalledNone(self):
+        self.assertEqual(self.relationship_in_outage.stdout, "unknown\n")
 
     def testTrustIsHealthyAgainAfterwards(self):
         self.assertLess(self.seconds_to_recover, 120)

@@ -62,5 +62,27 @@ TEST(TrustMappingTest, ARelationshipFollowsTheDirections) {
   EXPECT_EQ(RelationshipOf(0), 8U);
 }
 
+winbind::TrustedDomain JoinedDomain(uint32_t flags, bool online) {
+  return {"corp.example", "CORP", flags, online};
+}
+
+TEST(LearningTest, AnOfflineDomainAloneIsNoAnswer) {
+  EXPECT_TRUE(winbind::IsBeforeLearning({JoinedDomain(WBC_DOMINFO_TRUST_TRANSITIVE, false)}));
+}
+
+TEST(LearningTest, ADomainFromTheConfigurationAloneIsNoAnswer) {
+  EXPECT_TRUE(winbind::IsBeforeLearning(
+      {JoinedDomain(WBC_DOMINFO_TRUST_TRANSITIVE | WBC_DOMINFO_TRUST_OUTGOING, true)}));
+}
+
+TEST(LearningTest, ADomainThatTrustsNobodyIsAnAnswer) {
+  EXPECT_FALSE(winbind::IsBeforeLearning({JoinedDomain(WBC_DOMINFO_TRUST_TRANSITIVE, true)}));
+}
+
+TEST(LearningTest, WhatWasLearntBeforeAnOutageIsAnAnswer) {
+  EXPECT_FALSE(winbind::IsBeforeLearning(
+      {JoinedDomain(WBC_DOMINFO_TRUST_TRANSITIVE, false), {"other.example", "OTHER", 7, false}}));
+}
+
 }  // namespace
 }  // namespace sambaprovider

@@ -1,14 +1,20 @@
 #include "plugin/winbind.h"
 
 #include <algorithm>
+#include <chrono>
 #include <memory>
 #include <new>
+#include <thread>
 
 #include "common/status.h"
 #include "plugin/signal_guard.h"
 
 namespace sambaprovider::winbind {
 namespace {
+
+// How long winbindd may take, after it has started, to ask a controller for the trusted domains.
+constexpr std::chrono::seconds kLearningTime{3};
+constexpr std::chrono::milliseconds kLearningPause{100};
 
 // One connection, with SIGPIPE kept away while it is used and closed.
 class Connection {
@@ -57,7 +63,29 @@ std::string TextOf(const char* text) {
   return text == nullptr ? "" : text;
 }
 
+std::vector<TrustedDomain> ListKnownDomains() {
+  const Connection connection;
+  struct wbcDomainInfo* raw = nullptr;
+  size_t count = 0;
+  Check(wbcCtxListTrusts(connection.Get(), &raw, &count), kNoSuchDomain, "the trusted domains");
+  const Result<struct wbcDomainInfo> domains(raw);
+  std::vector<TrustedDomain> list;
+  for (size_t index = 0; index < count; ++index) {
+    const struct wbcDomainInfo& domain = raw[index];
+    if (domain.trust_type == WBC_DOMINFO_TRUSTTYPE_LOCAL) continue;
+    list.push_back({TextOf(domain.dns_name), TextOf(domain.short_name), domain.trust_flags,
+                    (domain.domain_flags & WBC_DOMINFO_DOMAIN_OFFLINE) == 0});
+  }
+  return list;
+}
+
 }  // namespace
+
+bool IsBeforeLearning(const std::vector<TrustedDomain>& domains) {
+  // Of the joined domain, the only one that it has from smb.conf, it assumes a direction until it has asked.
+  return domains.size() == 1 &&
+         (!domains.front().online || (domains.front().flags & WBC_DOMINFO_TRUST_OUTGOING) != 0);
+}
 
 bool Answers() {
   const Connection connection;
@@ -75,17 +103,15 @@ TrustCheck CheckTrust(const std::string& netbiosDomain) {
 }
 
 std::vector<TrustedDomain> ListDomains() {
-  const Connection connection;
-  struct wbcDomainInfo* raw = nullptr;
-  size_t count = 0;
-  Check(wbcCtxListTrusts(connection.Get(), &raw, &count), kNoSuchDomain, "the trusted domains");
-  const Result<struct wbcDomainInfo> domains(raw);
-  std::vector<TrustedDomain> list;
-  for (size_t index = 0; index < count; ++index) {
-    if (raw[index].trust_type == WBC_DOMINFO_TRUSTTYPE_LOCAL) continue;
-    list.push_back({TextOf(raw[index].dns_name), TextOf(raw[index].short_name), raw[index].trust_flags});
+  const auto deadline = std::chrono::steady_clock::now() + kLearningTime;
+  for (;;) {
+    std::vector<TrustedDomain> domains = ListKnownDomains();
+    if (!IsBeforeLearning(domains)) return domains;
+    if (std::chrono::steady_clock::now() >= deadline) {
+      throw Failure(kNoLogonServers, "winbindd has heard of the trusted domains from no controller yet");
+    }
+    std::this_thread::sleep_for(kLearningPause);
   }
-  return list;
 }
 
 std::string FindController(const std::string& dnsDomain, const std::string& site) {

@@ -30,10 +30,16 @@ struct TrustedDomain {
   std::string dnsName;
   std::string netbiosName;
   uint32_t flags = 0;  // WBC_DOMINFO_TRUST_...
+  bool online = false;
 };
 
-/// All domains but the host's own set of accounts and BUILTIN; the joined domain is among them. Throws
-/// Failure: kServiceNotActive when winbindd does not run, kNoLogonServers when it runs and has no answer.
+/// Whether this is the list of a winbindd that has not asked a controller for the trusted domains since it
+/// was started, so that nothing follows from what is missing in it.
+bool IsBeforeLearning(const std::vector<TrustedDomain>& domains);
+
+/// All domains but the host's own set of accounts and BUILTIN; the joined domain is among them. Waits some
+/// seconds for a winbindd that has just been started. Throws Failure: kServiceNotActive when winbindd does
+/// not run, kNoLogonServers when it runs and has no answer.
 std::vector<TrustedDomain> ListDomains();
 
 /// A controller's DNS name. `site` may be empty. Throws Failure: kNoSuchDomain, and as ListDomains.
