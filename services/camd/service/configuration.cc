@@ -32,9 +32,10 @@ class Section {
   // Refuses a text that was given and that `faultOf` finds a fault with; an empty one is none.
   template <typename Check>
   void Require(const char* key, const std::string& value, Check faultOf) {
-    const toml::node* node = Find(key);
-    const std::string fault = node == nullptr ? std::string() : faultOf(value);
-    if (!fault.empty()) Refuse(*node, fault);
+    if (const toml::node* node = Find(key)) {
+      const std::string fault = faultOf(value);
+      if (!fault.empty()) Refuse(*node, fault);
+    }
   }
 
   template <typename Number>
