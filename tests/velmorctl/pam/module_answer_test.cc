@@ -116,6 +116,11 @@ TEST_F(ModuleAnswerTest, LocalUserTellsLocalUsers) {
   EXPECT_EQ(Answer("pam_localuser.so"), "perm_denied");
 }
 
+TEST_F(ModuleAnswerTest, LocalUserHasNothingAgainstCredentials) {
+  AsDirectoryUser();
+  EXPECT_EQ(Answer("pam_localuser.so", Operation::SetCredentials), "success");
+}
+
 TEST_F(ModuleAnswerTest, NoLoginKeepsAllButRootOut) {
   EXPECT_EQ(Answer("pam_nologin.so"), "ignore");
   EXPECT_EQ(Answer("pam_nologin.so successok"), "success");
