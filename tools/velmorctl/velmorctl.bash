@@ -9,7 +9,7 @@ _velmorctl() {
     2:smartcard:*) words="list set" ;;
     2:cam:*) words="discover trust show forget test" ;;
     2:option:*) words="get set" ;;
-    2:pam:*) words="show check simulate" ;;
+    2:pam:*) words="show check simulate diff enable disable backups restore" ;;
     2:nss:*) words="show check diff add remove restore" ;;
     3:nss:show | 3:nss:add | 3:nss:remove)
       words="passwd group shadow gshadow hosts networks netgroup initgroups services protocols rpc ethers aliases"
@@ -17,6 +17,8 @@ _velmorctl() {
     3:store:use) words="None Active\ Directory" ;;
     *:join:* | *:leave:*) words="-U --password-file --password-fd --proxy" ;;
     3:pam:show | 3:pam:simulate) words="--all $(cd /etc/pam.d 2>/dev/null && compgen -f)" ;;
+    *:pam:diff) words="--enable --disable --root" ;;
+    *:pam:enable | *:pam:disable | *:pam:restore) words="--dry-run --root" ;;
     *:pam:*) words="--user --directory --answer --root --json up down" ;;
     *:nss:*) words="--root --dry-run --after --list --json" ;;
     *) words="--json --timeout" ;;

@@ -1,4 +1,4 @@
-/// The subcommands of "velmorctl pam", each in a file of its own.
+/// The subcommands of "velmorctl pam".
 #ifndef VELMORCTL_PAM_SUBCOMMANDS_H
 #define VELMORCTL_PAM_SUBCOMMANDS_H
 
@@ -11,6 +11,9 @@ namespace velmorctl::pam {
 void AddShow(CLI::App& pam, Invocation& invocation);
 void AddCheck(CLI::App& pam, Invocation& invocation);
 void AddSimulate(CLI::App& pam, Invocation& invocation);
+
+/// diff, enable, disable, backups and restore.
+void AddEdits(CLI::App& pam, Invocation& invocation);
 
 }  // namespace velmorctl::pam
 

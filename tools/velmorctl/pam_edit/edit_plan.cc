@@ -1,0 +1,339 @@
+#include "pam_edit/edit_plan.h"
+
+#include <algorithm>
+#include <set>
+
+#include "failure.h"
+#include "pam/check.h"
+#include "pam/policy_root.h"
+#include "pam/resolver.h"
+#include "pam_edit/edit_spot.h"
+#include "pam_edit/login_proof.h"
+#include "pam_edit/model_agreement.h"
+#include "pam_edit/own_line.h"
+#include "pam_edit/profile_change.h"
+#include "pam_edit/profile_tool.h"
+#include "pam_edit/stack_difference.h"
+
+namespace velmorctl::pam {
+
+namespace {
+
+using Policies = std::vector<Policy>;
+
+Policies ResolveAll(const Draft& draft) {
+  FileReader reader = draft.Reader();
+  Policies policies;
+  for (const std::string& service : PolicyRoot(draft.Root()).Services()) {
+    policies.push_back(ResolvePolicy(service, reader));
+  }
+  return policies;
+}
+
+std::set<std::string> FilesOf(const Policy& policy) {
+  std::set<std::string> files;
+  for (const Stack& stack : policy.stacks) {
+    for (const StackEntry& entry : stack) {
+      files.insert(entry.origin.file);
+    }
+  }
+  return files;
+}
+
+std::set<std::string> FilesOf(const Policies& policies) {
+  std::set<std::string> files;
+  for (const Policy& policy : policies) {
+    files.merge(FilesOf(policy));
+  }
+  return files;
+}
+
+/// Takes out what was put in before.
+Draft WithoutOwn(Draft draft) {
+  for (const std::string& file : FilesOf(ResolveAll(draft))) {
+    std::string content = draft.Content(file).value_or("");
+    std::string rest = WithoutOwnLines(content);
+    if (rest != content) {
+      draft.Write(file, rest);
+    }
+  }
+  RemoveProfile(draft);
+  return draft;
+}
+
+/// Why the policies differ in more than own entries; else empty.
+std::string UnexpectedDifference(const Policy& without, const Policy& with, const OwnModules& own) {
+  if (without.state != with.state) {
+    return "libpam would not read it as before";
+  }
+  for (Facility facility : facilities) {
+    std::string difference = UnexpectedDifference(without.StackOf(facility), with.StackOf(facility), own);
+    if (!difference.empty()) {
+      return difference;
+    }
+  }
+  return {};
+}
+
+bool IsChanged(const Policy& one, const Policy& other) {
+  return one.state != other.state ||
+         !std::equal(one.stacks.begin(), one.stacks.end(), other.stacks.begin(),
+                     [](const Stack& left, const Stack& right) { return left.size() == right.size(); });
+}
+
+std::string Place(const Origin& origin) {
+  return origin.file + ", line " + std::to_string(origin.line);
+}
+
+class EnablePlanner {
+ public:
+  EnablePlanner(const RootFolder& root, const DirectoryModule& module)
+      : module_(module), bare_(WithoutOwn(Draft(root))), policies_(ResolveAll(bare_)) {}
+
+  EditPlan Run() {
+    Choose();
+    for (;;) {
+      Draft next = Draw();
+      std::vector<Refusal> refused = Prove(next);
+      if (refused.empty()) {
+        return {std::move(next), std::move(notes_), std::move(refusals_)};
+      }
+      for (Refusal& refusal : refused) {
+        Drop(std::move(refusal));
+      }
+    }
+  }
+
+ private:
+  /// A service that is to be changed.
+  struct Meant {
+    std::string service;
+    std::vector<EditSpot> spots;
+  };
+
+  const Policy& PolicyOf(const std::string& service) const {
+    return *std::find_if(policies_.begin(), policies_.end(),
+                         [&service](const Policy& policy) { return policy.service == service; });
+  }
+
+  void Choose() {
+    for (const Policy& policy : policies_) {
+      if (!IsLoginService(policy, {})) {
+        continue;
+      }
+      if (const StackEntry* there = AuthEntryOf(policy, module_.name)) {
+        LeaveAsItIs(policy, *there);
+        continue;
+      }
+      EditSpots found = FindEditSpots(bare_, policy, module_);
+      if (found.problem.empty()) {
+        meant_.push_back({policy.service, std::move(found.spots)});
+      } else {
+        refusals_.push_back({policy.service, found.problem});
+      }
+    }
+    if (meant_.empty() && notes_.empty() && refusals_.empty()) {
+      throw Failure(ExitCode::HostNotReady, "there is no service through which people log in")
+          .Detail("reason",
+                  "no auth stack below " + bare_.Root().Shown(policyFolders[0]) + " reaches pam_unix.so")
+          .Try("velmorctl pam check");
+    }
+  }
+
+  /// The module is there by the administrator's hand, or by a profile of the distribution.
+  void LeaveAsItIs(const Policy& policy, const StackEntry& there) {
+    std::string shutOut = ShutOut(policy, policy, module_.name);
+    if (!shutOut.empty()) {
+      refusals_.push_back(
+          {policy.service, Place(there.origin) + " calls " + there.module + " already, but " + shutOut});
+      return;
+    }
+    std::string profile =
+        IsKeptByProfiles(bare_, there.origin.file) ? ProfileWithModule(bare_, there.module) : "";
+    AddNote(Place(there.origin) + " calls " + there.module + " already" +
+            (profile.empty() ? "" : " by the profile \"" + profile + "\" of pam-auth-update") +
+            "; the services that use it stay as they are.");
+  }
+
+  void AddNote(const std::string& note) {
+    if (std::find(notes_.begin(), notes_.end(), note) == notes_.end()) {
+      notes_.push_back(note);
+    }
+  }
+
+  bool IsDropped(const EditSpot& spot) const {
+    return spot.byProfile ? profileDropped_ : droppedFiles_.contains(spot.file);
+  }
+
+  /// The spots of all services that are meant to change, from the end of each file to its beginning, so that
+  /// the numbers of the lines hold.
+  std::vector<EditSpot> Spots() const {
+    std::set<EditSpot> spots;
+    for (const Meant& meant : meant_) {
+      spots.insert(meant.spots.begin(), meant.spots.end());
+    }
+    std::erase_if(spots, [this](const EditSpot& spot) { return IsDropped(spot); });
+    return {spots.rbegin(), spots.rend()};
+  }
+
+  Draft Draw() const {
+    Draft next = bare_;
+    std::vector<EditSpot> spots = Spots();
+    if (std::any_of(spots.begin(), spots.end(), [](const EditSpot& spot) { return spot.byProfile; })) {
+      AddProfile(next, module_);
+    }
+    for (const EditSpot& spot : spots) {
+      std::string content = next.RequiredContent(spot.file);
+      for (const OwnLine& line : spot.lines) {
+        content = WithOwnLine(content, spot.line, line);
+      }
+      next.Write(spot.file, content);
+    }
+    return next;
+  }
+
+  std::vector<Refusal> Prove(const Draft& next) const {
+    std::vector<Refusal> refused;
+    FileReader reader = next.Reader();
+    for (const Policy& before : policies_) {
+      std::string reason = ProblemOf(before, ResolvePolicy(before.service, reader), next);
+      if (!reason.empty()) {
+        refused.push_back({before.service, reason});
+      }
+    }
+    return refused;
+  }
+
+  /// Why the service must not become what it would; else empty.
+  std::string ProblemOf(const Policy& before, const Policy& after, const Draft& next) const {
+    bool meant = std::any_of(meant_.begin(), meant_.end(),
+                             [&before](const Meant& other) { return other.service == before.service; });
+    if (!meant && !IsChanged(before, after)) {
+      return {};
+    }
+    std::string problem = UnexpectedDifference(before, after, {module_.name});
+    if (problem.empty()) {
+      problem = ProblemOfFiles(before, next);
+    }
+    if (problem.empty()) {
+      problem = UnsafeChange(before, after, module_.name);
+    }
+    return problem.empty() && meant ? ShutOut(before, after, module_.name) : problem;
+  }
+
+  std::string ProblemOfFiles(const Policy& policy, const Draft& next) const {
+    for (const std::string& file : FilesOf(policy)) {
+      std::string before = bare_.Content(file).value_or("");
+      std::string after = next.Content(file).value_or("");
+      if (!ModelAgrees(before, after, {module_.name})) {
+        return "read another way, " + file + " would change in more than was asked for";
+      }
+      if (!IsKeptByProfiles(bare_, file) && WithoutOwnLines(after) != before) {
+        return "the change of " + file + " could not be undone byte for byte";
+      }
+    }
+    return {};
+  }
+
+  /// Leaves the service as it is, and with it the files that it shares and the services that need these
+  /// changed.
+  void Drop(Refusal refusal) {
+    std::set<std::string> files = FilesOf(PolicyOf(refusal.service));
+    auto isShared = [&](const EditSpot& spot) { return files.contains(spot.file); };
+    for (const EditSpot& spot : Spots()) {
+      if (isShared(spot) && spot.byProfile) {
+        profileDropped_ = true;
+      } else if (isShared(spot)) {
+        droppedFiles_.insert(spot.file);
+      }
+    }
+    std::vector<Meant> kept;
+    for (Meant& meant : meant_) {
+      auto dropped = std::find_if(meant.spots.begin(), meant.spots.end(),
+                                  [this](const EditSpot& spot) { return IsDropped(spot); });
+      if (meant.service == refusal.service) {
+        continue;
+      }
+      if (dropped == meant.spots.end()) {
+        kept.push_back(std::move(meant));
+      } else {
+        refusals_.push_back({meant.service, "it shares " + dropped->file + " with " + refusal.service +
+                                                ", which stays as it is"});
+      }
+    }
+    meant_ = std::move(kept);
+    std::erase_if(refusals_, [&](const Refusal& other) { return other.service == refusal.service; });
+    refusals_.push_back(std::move(refusal));
+  }
+
+  const DirectoryModule& module_;
+  Draft bare_;
+  Policies policies_;
+  std::vector<Meant> meant_;
+  std::set<std::string> droppedFiles_;
+  bool profileDropped_ = false;
+  std::vector<std::string> notes_;
+  std::vector<Refusal> refusals_;
+};
+
+void RequireModule(const RootFolder& root, const DirectoryModule& module) {
+  if (!PolicyRoot(root).HasModule(module.name)) {
+    std::string name = ModuleName(module.name);
+    std::replace(name.begin(), name.end(), '_', '-');
+    throw Failure(ExitCode::HostNotReady,
+                  "the PAM module of the provider '" + module.provider + "' is not there")
+        .Detail("value", module.name)
+        .Try("install the package that brings it; Debian's is called lib" + name);
+  }
+}
+
+OwnModules OwnModulesIn(const Draft& draft, const Policies& policies) {
+  OwnModules own = ModulesOfProfile(draft);
+  for (const std::string& file : FilesOf(policies)) {
+    std::vector<std::string> modules = ModulesOfOwnLines(draft.Content(file).value_or(""));
+    own.insert(modules.begin(), modules.end());
+  }
+  return own;
+}
+
+std::vector<std::string> NotesOnRemaining(const Policies& policies, const std::string& module) {
+  std::set<std::string> notes;
+  for (const Policy& policy : policies) {
+    for (const Stack& stack : policy.stacks) {
+      for (const StackEntry& entry : stack) {
+        if (ModuleName(entry.module) == ModuleName(module)) {
+          notes.insert(Place(entry.origin) + " calls " + entry.module +
+                       " too; velmorctl did not write that, and it stays.");
+        }
+      }
+    }
+  }
+  return {notes.begin(), notes.end()};
+}
+
+}  // namespace
+
+EditPlan PlanEnable(const RootFolder& root, const DirectoryModule& module) {
+  RequireModule(root, module);
+  return EnablePlanner(root, module).Run();
+}
+
+EditPlan PlanDisable(const RootFolder& root, const std::optional<DirectoryModule>& module) {
+  Draft current(root);
+  Policies before = ResolveAll(current);
+  Draft bare = WithoutOwn(current);
+  Policies after = ResolveAll(bare);
+  OwnModules own = OwnModulesIn(current, before);
+  for (std::size_t index = 0; index < before.size(); ++index) {
+    std::string problem = UnexpectedDifference(after[index], before[index], own);
+    if (!problem.empty()) {
+      throw Failure(ExitCode::HostNotReady,
+                    "the service '" + before[index].service + "' would not be what it was without the module")
+          .Detail("reason", problem)
+          .Try("velmorctl pam restore, if nothing else was changed since");
+    }
+  }
+  return {std::move(bare), module ? NotesOnRemaining(after, module->name) : std::vector<std::string>(), {}};
+}
+
+}  // namespace velmorctl::pam
