@@ -1,4 +1,5 @@
-/* A plug-in that does harm while it is loaded, or names no modules; which one is a matter of the build. */
+/* A plug-in that does harm while it is loaded, or names no modules or bad ones; which one is a matter of the
+ * build. */
 #include <stdlib.h>
 #include <unistd.h>
 
@@ -18,5 +19,10 @@ __attribute__((constructor)) static void doHarm(void) {
 }
 #endif
 
+#ifdef BAD_WORDS
+const struct ActiveDirectoryClientMetadata ActiveDirectoryClientMetadata = {3, "pam_words.so", "a #b",
+                                                                            "words", NULL};
+#else
 const struct ActiveDirectoryClientMetadata ActiveDirectoryClientMetadata = {3, NULL, NULL, NULL, NULL};
+#endif
 const struct ActiveDirectoryClientOperations ActiveDirectoryClientOperations = {.apiVersion = 3};
