@@ -6,9 +6,9 @@
 
 #include <cstring>
 
-#include "common/secret.h"
 #include "expect_failure.h"
 #include "support/files.h"
+#include "velmor/secret.h"
 
 namespace sambaprovider {
 namespace {
@@ -44,7 +44,7 @@ TEST(MessageTest, AnAnswerThatIsNotUnderstoodCountsAsADeath) {
 
 TEST(MessageTest, TheSecretIsNotInTheLine) {
   Request request = Simple();
-  request.secret = Secret(std::string_view("Passw0rd"));
+  request.secret = velmor::Secret(std::string_view("Passw0rd"));
   const Answer answer = AskScript(
       "read line; case \"$line\" in *Passw0rd*) exit 1;; esac\n"
       "[ \"$(head -c 8)\" = Passw0rd ] && echo '{\"status\":0,\"text\":\"apart\"}'",
@@ -64,21 +64,6 @@ TEST(MessageTest, AFieldThatIsNoTextIsRefused) {
   request.fields = {{"user", 1}};
   EXPECT_FAILURE(request.Text("user"), 87);
   EXPECT_EQ(request.Text("absent"), "");
-}
-
-TEST(SecretTest, ItKeepsACopyWithATerminator) {
-  const Secret secret(std::string_view("abc"));
-  EXPECT_EQ(secret.Size(), 3U);
-  EXPECT_STREQ(secret.Text(), "abc");
-}
-
-TEST(SecretTest, MovingLeavesNothingBehind) {
-  Secret first(std::string_view("abc"));
-  const char* const place = first.Text();
-  const Secret second = std::move(first);
-  EXPECT_EQ(second.Text(), place);
-  EXPECT_EQ(first.Size(), 0U);
-  EXPECT_STREQ(first.Text(), "");
 }
 
 }  // namespace

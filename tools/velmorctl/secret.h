@@ -4,31 +4,27 @@
 
 #include <cstddef>
 
+#include "velmor/secret.h"
+
 namespace velmorctl {
 
-/// A zero-terminated text that stays in one place, is left out of swap and core dumps where the system
-/// allows it, and is wiped when this object ends. For one thread at a time.
+/// A zero-terminated text that is written character by character into the memory of a velmor::Secret. For one
+/// thread at a time.
 class Secret {
  public:
   /// The greatest number of characters.
   static constexpr std::size_t maximumLength = 4000;
-
-  /// Throws std::bad_alloc when there is no memory.
-  Secret();
-  Secret(const Secret&) = delete;
-  Secret& operator=(const Secret&) = delete;
-  ~Secret();
 
   /// Appends a character; false when the text is full.
   bool Append(char character);
   void RemoveLast();
   void Clear();
 
-  const char* Text() const noexcept { return memory_; }
+  const char* Text() const noexcept { return memory_.Text(); }
   std::size_t Length() const noexcept { return length_; }
 
  private:
-  char* memory_;
+  velmor::Secret memory_{maximumLength};
   std::size_t length_ = 0;
 };
 

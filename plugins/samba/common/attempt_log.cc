@@ -13,7 +13,7 @@
 
 #include "common/paths.h"
 #include "common/status.h"
-#include "common/unique_fd.h"
+#include "velmor/unique_fd.h"
 
 namespace sambaprovider {
 namespace {
@@ -84,7 +84,7 @@ void AttemptLog::Append(const char* event, const std::string& step, uint32_t sta
                         const std::string& text) const {
   try {
     const std::string line = FormatAttemptLine(Now(), process_, operation_, step, event, status, text);
-    const UniqueFd record(
+    const velmor::UniqueFd record(
         open(paths::kAttempts, O_WRONLY | O_APPEND | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
     if (!record.IsOpen() || write(record.Get(), line.data(), line.size()) < 0) return;
   } catch (const std::exception&) {

@@ -19,7 +19,7 @@ extern "C" {
 
 #include "common/files.h"
 #include "common/status.h"
-#include "common/unique_fd.h"
+#include "velmor/unique_fd.h"
 
 namespace sambaprovider {
 namespace {
@@ -159,7 +159,7 @@ class Child {
 
   pid_t process_;
   ChildGroup group_;
-  UniqueFd handle_;
+  velmor::UniqueFd handle_;
   bool collected_ = false;
 };
 
@@ -228,8 +228,8 @@ Conversation Converse(const std::string& path, ChildGroup group, ChildEnvironmen
   if (socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, pair.data()) != 0) {
     throw Failure(kInternalError, "cannot make a socket pair: " + ErrorText(errno));
   }
-  const UniqueFd ours(pair[0]);
-  UniqueFd theirs(pair[1]);
+  const velmor::UniqueFd ours(pair[0]);
+  velmor::UniqueFd theirs(pair[1]);
   SpawnPlan plan(group);
   plan.ConnectBothWays(theirs.Get());
   Child child(plan, {path}, group, environment);
@@ -254,8 +254,8 @@ ProgramResult RunProgram(const std::vector<std::string>& command, ProgramOutput 
   if (pipe2(pipeEnds.data(), O_CLOEXEC) != 0) {
     throw Failure(kInternalError, "cannot make a pipe: " + ErrorText(errno));
   }
-  const UniqueFd readEnd(pipeEnds[0]);
-  UniqueFd writeEnd(pipeEnds[1]);
+  const velmor::UniqueFd readEnd(pipeEnds[0]);
+  velmor::UniqueFd writeEnd(pipeEnds[1]);
   SpawnPlan plan(ChildGroup::kCallers);
   if (output == ProgramOutput::kWanted) {
     plan.ConnectOutput(writeEnd.Get());

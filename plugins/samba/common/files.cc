@@ -11,7 +11,7 @@
 #include <system_error>
 
 #include "common/status.h"
-#include "common/unique_fd.h"
+#include "velmor/unique_fd.h"
 
 namespace sambaprovider {
 namespace {
@@ -25,13 +25,13 @@ std::string FolderOf(const std::string& path) {
 }
 
 void FlushFolderOf(const std::string& path) {
-  const UniqueFd folder(open(FolderOf(path).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  const velmor::UniqueFd folder(open(FolderOf(path).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
   if (!folder.IsOpen() || fsync(folder.Get()) != 0) Fail("flush the folder of", path, errno);
 }
 
 // Nothing is open when there is no such file.
-UniqueFd OpenWhenThere(const std::string& path) {
-  UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
+velmor::UniqueFd OpenWhenThere(const std::string& path) {
+  velmor::UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC));
   if (!file.IsOpen() && errno != ENOENT) Fail("read", path, errno);
   return file;
 }
@@ -61,7 +61,7 @@ void WriteAll(int descriptor, std::string_view content, const std::string& path)
 class TemporaryFile {
  public:
   explicit TemporaryFile(const std::string& target) : path_(target + ".XXXXXX") {
-    descriptor_ = UniqueFd(mkostemp(path_.data(), O_CLOEXEC));
+    descriptor_ = velmor::UniqueFd(mkostemp(path_.data(), O_CLOEXEC));
     if (!descriptor_.IsOpen()) Fail("create a file beside", target, errno);
   }
   TemporaryFile(const TemporaryFile&) = delete;
@@ -81,7 +81,7 @@ class TemporaryFile {
 
  private:
   std::string path_;
-  UniqueFd descriptor_;
+  velmor::UniqueFd descriptor_;
   bool renamed_ = false;
 };
 
@@ -93,7 +93,7 @@ std::string ErrorText(int error) {
 }
 
 std::optional<std::string> ReadFile(const std::string& path) {
-  const UniqueFd file = OpenWhenThere(path);
+  const velmor::UniqueFd file = OpenWhenThere(path);
   if (!file.IsOpen()) return std::nullopt;
   return ReadAll(file.Get(), path);
 }
@@ -106,7 +106,7 @@ void ReplaceFile(const std::string& path, std::string_view content, mode_t mode)
 }
 
 bool CopyFile(const std::string& from, const std::string& to) {
-  const UniqueFd file = OpenWhenThere(from);
+  const velmor::UniqueFd file = OpenWhenThere(from);
   if (!file.IsOpen()) return false;
   struct stat original = {};
   if (fstat(file.Get(), &original) != 0) Fail("read", from, errno);

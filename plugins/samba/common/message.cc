@@ -27,9 +27,9 @@ std::string ReadLine() {
   throw Failure(kInvalidParameter, "the request is not a line");
 }
 
-Secret ReadSecret(size_t size) {
+velmor::Secret ReadSecret(size_t size) {
   if (size > kLongestSecret) throw Failure(kInvalidParameter, "the secret is too long");
-  Secret secret(size);
+  velmor::Secret secret(size);
   for (size_t done = 0; done < size;) {
     const ssize_t count = read(STDIN_FILENO, secret.Data() + done, size - done);
     if (count < 0 && errno == EINTR) continue;

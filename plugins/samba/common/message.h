@@ -8,13 +8,13 @@
 #include <string>
 
 #include "common/child.h"
-#include "common/secret.h"
+#include "velmor/secret.h"
 
 namespace sambaprovider {
 
 struct Request {
   nlohmann::json fields;
-  Secret secret;
+  velmor::Secret secret;
 
   /// A field's text; empty when it is absent. Throws Failure (kInvalidParameter) when it is no text.
   std::string Text(const char* field) const;

@@ -25,7 +25,7 @@ OperationLock::OperationLock() {
   if (geteuid() != 0) throw Failure(kAccessDenied, "only root may change the host's membership");
   MakeFolder("/var/lib/quenix", 0755);
   MakeFolder(paths::kStateFolder, 0755);
-  file_ = UniqueFd(open(paths::kLock, O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
+  file_ = velmor::UniqueFd(open(paths::kLock, O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
   if (!file_.IsOpen())
     throw Failure(kInternalError, std::string("cannot open ") + paths::kLock + ": " + ErrorText(errno));
   const auto deadline = std::chrono::steady_clock::now() + kPatience;

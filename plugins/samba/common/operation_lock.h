@@ -2,7 +2,7 @@
 #ifndef SAMBA_COMMON_OPERATION_LOCK_H
 #define SAMBA_COMMON_OPERATION_LOCK_H
 
-#include "common/unique_fd.h"
+#include "velmor/unique_fd.h"
 
 namespace sambaprovider {
 
@@ -15,7 +15,7 @@ class OperationLock {
   OperationLock();
 
  private:
-  UniqueFd file_;
+  velmor::UniqueFd file_;
 };
 
 }  // namespace sambaprovider

@@ -73,7 +73,7 @@ class Membership {
     });
   }
 
-  void StoreSecrets(const Secret& blob) {
+  void StoreSecrets(const velmor::Secret& blob) {
     StopWhenCallerHasGone();
     call_.log.Run("secrets", "storing the machine's secrets", [&] {
       netapi::StoreSecrets(blob);
@@ -164,14 +164,14 @@ std::string Join(const Call& call) {
   membership.Prepare();
   try {
     membership.Configure();
-    Secret blob;
+    velmor::Secret blob;
     call.log.Run("provision", "making the computer account on " + found.controller, [&] {
       blob = netapi::ProvisionAccount(domain, computer, found.organizationalUnitDn, found.controller, user,
                                       call.request.secret);
       return "made";
     });
     membership.StoreSecrets(blob);
-    blob = Secret();
+    blob = velmor::Secret();
     membership.CreateKeytab(found.controller);
     membership.StartService();
     membership.Finish(found.accountDn.empty() ? FindAccountDn(logon) : found.accountDn);

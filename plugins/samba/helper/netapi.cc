@@ -57,9 +57,9 @@ void Check(NET_API_STATUS result, const char* action) {
 
 }  // namespace
 
-Secret ProvisionAccount(const std::string& dnsDomain, const std::string& computer,
-                        const std::string& organizationalUnitDn, const std::string& controller,
-                        const std::string& user, const Secret& password) {
+velmor::Secret ProvisionAccount(const std::string& dnsDomain, const std::string& computer,
+                                const std::string& organizationalUnitDn, const std::string& controller,
+                                const std::string& user, const velmor::Secret& password) {
   Check(libnetapi_set_username(Context(), user.c_str()), "setting the user name");
   Check(libnetapi_set_password(Context(), password.Text()), "setting the password");
   const char* text = nullptr;
@@ -68,16 +68,16 @@ Secret ProvisionAccount(const std::string& dnsDomain, const std::string& compute
                                     controller.c_str(), NETSETUP_PROVISION_REUSE_ACCOUNT, nullptr, nullptr,
                                     &text),
         "making the computer account");
-  Secret blob{std::string_view(text)};
+  velmor::Secret blob{std::string_view(text)};
   char* const original = const_cast<char*>(text);
   explicit_bzero(original, blob.Size());
   NetApiBufferFree(original);
   return blob;
 }
 
-void StoreSecrets(const Secret& blob) {
+void StoreSecrets(const velmor::Secret& blob) {
   // The call takes UTF-16 with a byte order mark and a terminator.
-  Secret wide(4 + 2 * blob.Size());
+  velmor::Secret wide(4 + 2 * blob.Size());
   char* to = wide.Data();
   *to++ = '\xff';
   *to++ = '\xfe';
@@ -91,7 +91,7 @@ void StoreSecrets(const Secret& blob) {
   if (static_cast<uint32_t>(result) != kMustRestart) Check(result, "storing the machine's secrets");
 }
 
-void Unjoin(const std::string& user, const Secret& password) {
+void Unjoin(const std::string& user, const velmor::Secret& password) {
   Context();
   Check(NetUnjoinDomain(nullptr, user.c_str(), password.Text(), NETSETUP_JOIN_DOMAIN | NETSETUP_ACCT_DELETE),
         "leaving the domain");

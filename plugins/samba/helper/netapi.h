@@ -4,7 +4,7 @@
 
 #include <string>
 
-#include "common/secret.h"
+#include "velmor/secret.h"
 
 namespace sambaprovider::netapi {
 
@@ -13,15 +13,15 @@ namespace sambaprovider::netapi {
 
 /// Makes, or takes again, the computer account, and returns the text that the second half needs. The
 /// organisational unit is a DN that exists, or empty.
-Secret ProvisionAccount(const std::string& dnsDomain, const std::string& computer,
-                        const std::string& organizationalUnitDn, const std::string& controller,
-                        const std::string& user, const Secret& password);
+velmor::Secret ProvisionAccount(const std::string& dnsDomain, const std::string& computer,
+                                const std::string& organizationalUnitDn, const std::string& controller,
+                                const std::string& user, const velmor::Secret& password);
 
 /// Writes the machine's secrets on this host; needs no network. smb.conf must be that of a member already.
-void StoreSecrets(const Secret& blob);
+void StoreSecrets(const velmor::Secret& blob);
 
 /// Disables the computer account and removes the machine's secrets from this host.
-void Unjoin(const std::string& user, const Secret& password);
+void Unjoin(const std::string& user, const velmor::Secret& password);
 
 /// Removes the machine's secrets from this host; needs neither network nor account.
 void UnjoinLocally();

@@ -22,7 +22,7 @@ Answer AskPrecheck(const char* operation, const LogonRequest& logon, const nlohm
                     {"user", logon.user},
                     {"computer", logon.computer}};
   request.fields.update(more);
-  request.secret = Secret(logon.password.View());
+  request.secret = velmor::Secret(logon.password.View());
   Answer answer = Ask(paths::kPrecheck, ChildGroup::kCallers, ChildEnvironment::kCallers, request, kLimit);
   if (answer.end == Conversation::End::kAnswered) return answer;
   const bool late = answer.end == Conversation::End::kDeadline;

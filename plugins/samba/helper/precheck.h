@@ -6,7 +6,7 @@
 #include <vector>
 
 #include "common/attempt_log.h"
-#include "common/secret.h"
+#include "velmor/secret.h"
 
 namespace sambaprovider {
 
@@ -15,7 +15,7 @@ struct LogonRequest {
   std::string dnsDomain;
   std::vector<std::string> controllers;
   std::string user;
-  const Secret& password;
+  const velmor::Secret& password;
   std::string computer;  // this host's computer name
 };
 

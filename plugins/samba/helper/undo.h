@@ -5,15 +5,15 @@
 #include <string>
 
 #include "common/attempt_log.h"
-#include "common/secret.h"
 #include "helper/journal.h"
+#include "velmor/secret.h"
 
 namespace sambaprovider {
 
 /// The account that a join was started with, when it is at hand.
 struct UndoAccount {
   std::string user;
-  const Secret& password;
+  const velmor::Secret& password;
 };
 
 /// Takes a join back as far as it got: remembered domain, machine secrets, computer account when the join

@@ -21,7 +21,7 @@ extern "C" {  // which these headers lack
 #include "common/child.h"
 #include "common/files.h"
 #include "common/status.h"
-#include "common/unique_fd.h"
+#include "velmor/unique_fd.h"
 
 namespace sambaprovider::winbind_service {
 namespace {
@@ -49,7 +49,7 @@ void SystemCtl(const std::vector<std::string>& verb, std::chrono::milliseconds l
 
 struct Process {
   pid_t number = -1;
-  UniqueFd handle;
+  velmor::UniqueFd handle;
 };
 
 // The running winbindd; the handle is closed when none runs.
@@ -58,7 +58,7 @@ Process RunningProcess() {
   Process process;
   std::from_chars(text.data(), text.data() + text.size(), process.number);
   if (process.number <= 0) return {};
-  process.handle = UniqueFd(pidfd_open(process.number, 0));
+  process.handle = velmor::UniqueFd(pidfd_open(process.number, 0));
   // The file may be left over from a process whose number now belongs to another.
   const std::string name = ReadFile("/proc/" + std::to_string(process.number) + "/comm").value_or("");
   if (name.rfind("winbindd", 0) != 0) return {};
@@ -87,7 +87,7 @@ void StartDirectly() {
     throw Failure(kServiceNotActive, "winbindd does not start; see /var/log/samba/log.winbindd");
 }
 
-bool EndsWithin(const UniqueFd& process, std::chrono::milliseconds limit) {
+bool EndsWithin(const velmor::UniqueFd& process, std::chrono::milliseconds limit) {
   pollfd entry = {process.Get(), POLLIN, 0};
   return poll(&entry, 1, static_cast<int>(limit.count())) == 1;
 }

@@ -21,7 +21,8 @@ uint32_t JoinDomain(const char* domain, const char* organizationalUnit, const Cr
                       {"domain", Text(domain)},
                       {"organizationalUnit", Text(organizationalUnit)},
                       {"user", Text(credentials->username)}};
-    request.secret = Secret(std::string_view(credentials->password == nullptr ? "" : credentials->password));
+    request.secret =
+        velmor::Secret(std::string_view(credentials->password == nullptr ? "" : credentials->password));
     RunHelper(std::move(request));
   });
 }
@@ -33,7 +34,7 @@ uint32_t PartDomain(const Credentials* credentials) {
     if (credentials != nullptr) {
       request.fields["user"] = Text(credentials->username);
       request.secret =
-          Secret(std::string_view(credentials->password == nullptr ? "" : credentials->password));
+          velmor::Secret(std::string_view(credentials->password == nullptr ? "" : credentials->password));
     }
     RunHelper(std::move(request));
   });
@@ -49,7 +50,7 @@ uint32_t JoinDomainWithMachineAccount(const ActiveDirectoryDomainInfo* domain,
                       {"dnsDomain", Text(domain->dnsDomainName)},
                       {"netbiosDomain", Text(domain->netbiosDomainName)},
                       {"accountName", Text(account->accountName)}};
-    request.secret = Secret(std::string_view(account->joinBlob == nullptr ? "" : account->joinBlob));
+    request.secret = velmor::Secret(std::string_view(account->joinBlob == nullptr ? "" : account->joinBlob));
     RunHelper(std::move(request));
   });
 }

@@ -47,7 +47,7 @@ class Session {
   }
 
   // Not krb5_get_init_creds_password: that asks a second controller when the first one refuses.
-  void GetTicket(const Secret& password) {
+  void GetTicket(const velmor::Secret& password) {
     Check(krb5_init_creds_init(context_, principal_, nullptr, nullptr, 0, options_, &exchange_));
     Check(krb5_init_creds_set_password(context_, exchange_, password.Text()));
     Check(krb5_init_creds_get(context_, exchange_));
@@ -127,7 +127,7 @@ void DirectKerberosTo(const std::string& realm, const std::string& controller) {
   }
 }
 
-void LogOn(const std::string& realm, const AccountName& account, const Secret& password) {
+void LogOn(const std::string& realm, const AccountName& account, const velmor::Secret& password) {
   // Tickets in a MEMORY cache live as long as the process, not as long as the session that put them there.
   Session session;
   session.SetAccount(realm, account);

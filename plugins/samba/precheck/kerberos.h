@@ -7,7 +7,7 @@
 #include <string>
 
 #include "common/names.h"
-#include "common/secret.h"
+#include "velmor/secret.h"
 
 namespace sambaprovider {
 
@@ -23,7 +23,7 @@ void DirectKerberosTo(const std::string& realm, const std::string& controller);
 /// Asks once for a ticket for `account` in `realm` and keeps it where GSSAPI finds it, until the process
 /// ends. A name with a domain of its own is left to the controller to understand. Throws Failure with the
 /// reason.
-void LogOn(const std::string& realm, const AccountName& account, const Secret& password);
+void LogOn(const std::string& realm, const AccountName& account, const velmor::Secret& password);
 
 }  // namespace sambaprovider
 

@@ -1,12 +1,12 @@
 /// A file descriptor that is closed by its owner's end.
-#ifndef SAMBA_COMMON_UNIQUE_FD_H
-#define SAMBA_COMMON_UNIQUE_FD_H
+#ifndef VELMOR_UNIQUE_FD_H
+#define VELMOR_UNIQUE_FD_H
 
 #include <unistd.h>
 
 #include <utility>
 
-namespace sambaprovider {
+namespace velmor {
 
 class UniqueFd {
  public:
@@ -32,6 +32,6 @@ class UniqueFd {
   int descriptor_ = -1;
 };
 
-}  // namespace sambaprovider
+}  // namespace velmor
 
-#endif  // SAMBA_COMMON_UNIQUE_FD_H
+#endif  // VELMOR_UNIQUE_FD_H
