@@ -5,6 +5,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 #include <filesystem>
 #include <stdexcept>
@@ -62,9 +63,11 @@ void CopyFiles(const fs::path& from, const fs::path& to) {
   }
 }
 
-/// Profiles that hosts without a directory have.
-bool IsOrdinaryProfile(const std::string& package) {
-  return package != "libpam-winbind" && package != "libpam-sss" && package != "libpam-pwquality";
+/// Packages whose profiles a host without a directory does not have.
+const std::vector<std::string> OTHER_PROFILES = {"libpam-winbind", "libpam-sss", "libpam-pwquality"};
+
+void CopyProfiles(const fs::path& package, const fs::path& root) {
+  CopyFiles(package / "usr/share/pam-configs", root / "usr/share/pam-configs");
 }
 
 std::string Describe(const fs::path& path) {
@@ -131,12 +134,20 @@ DebianRoot::DebianRoot() {
   for (const fs::directory_entry& package : fs::directory_iterator(DEBIAN_POLICIES)) {
     CopyFiles(package.path() / "etc/pam.d", Path() + "/etc/pam.d");
     CopyFiles(package.path() / "usr/lib/pam.d", Path() + "/usr/lib/pam.d");
-    if (IsOrdinaryProfile(package.path().filename())) {
-      CopyFiles(package.path() / "usr/share/pam-configs", Path() + "/usr/share/pam-configs");
+    const std::string name = package.path().filename();
+    if (std::find(OTHER_PROFILES.begin(), OTHER_PROFILES.end(), name) == OTHER_PROFILES.end()) {
+      CopyProfiles(package.path(), Path());
     }
   }
   testsupport::MakeFolders(Path() + "/var/lib/pam");
   UpdateProfiles({"--package", "--force"});
+}
+
+void DebianRoot::AddOtherProfiles() const {
+  for (const std::string& package : OTHER_PROFILES) {
+    CopyProfiles(fs::path(DEBIAN_POLICIES) / package, Path());
+  }
+  UpdateProfiles({"--package"});
 }
 
 void DebianRoot::UpdateProfiles(const std::vector<std::string>& arguments) const {

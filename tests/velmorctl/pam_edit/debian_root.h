@@ -46,6 +46,9 @@ class DebianRoot : public HostRoot {
  public:
   DebianRoot();
 
+  /// Installs and enables the profiles of other directories and of pam_pwquality too.
+  void AddOtherProfiles() const;
+
   /// Runs the real pam-auth-update on the root.
   void UpdateProfiles(const std::vector<std::string>& arguments) const;
 

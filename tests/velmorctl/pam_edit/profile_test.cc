@@ -175,6 +175,21 @@ TEST_F(PamProfileTest, PamAuthUpdateTakesTheResultForItsOwn) {
   EXPECT_EQ(root_.Files(), enabled);
 }
 
+TEST_F(PamProfileTest, OtherDirectoriesAndPasswordRulesStayBesideIt) {
+  root_.AddOtherProfiles();
+  ASSERT_PRED2(Contains, root_.Read(COMMON_AUTH), "pam_sss.so");
+  ASSERT_PRED2(Contains, root_.Read("/etc/pam.d/common-password"), "pam_pwquality.so");
+  const Tree before = root_.Files();
+  const Outcome outcome = root_.Pam({"enable"});
+  ASSERT_EQ(outcome.exitCode, 0) << outcome.errors;
+  const std::vector<std::string> nobodyElse = {"pam_sss=user_unknown", "pam_winbind=user_unknown"};
+  EXPECT_TRUE(root_.LetsIn("sshd", "dora", "up", nobodyElse));
+  EXPECT_FALSE(root_.LetsIn("sshd", "dora", "down", nobodyElse));
+  EXPECT_TRUE(root_.LetsIn("sshd", "local", "down"));
+  ASSERT_EQ(root_.Pam({"disable"}).exitCode, 0);
+  EXPECT_EQ(root_.Files(), before);
+}
+
 TEST_F(PamProfileTest, DisablingLeavesWhatOtherPackagesDidMeanwhile) {
   const Tree before = root_.Files();
   ASSERT_EQ(root_.Pam({"enable"}).exitCode, 0);
