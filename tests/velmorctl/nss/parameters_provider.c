@@ -3,6 +3,6 @@
 
 #include "authentication/plugin/active_directory_client.h"
 
-const struct ActiveDirectoryClientMetadata ActiveDirectoryClientMetadata = {3, "pam_some.so", NULL, NSS_MODULE,
-                                                                            "UNAVAIL=continue TRYAGAIN=return"};
+const struct ActiveDirectoryClientMetadata ActiveDirectoryClientMetadata = {
+    3, "pam_some.so", NULL, NSS_MODULE, "UNAVAIL=continue TRYAGAIN=return"};
 const struct ActiveDirectoryClientOperations ActiveDirectoryClientOperations = {.apiVersion = 3};
