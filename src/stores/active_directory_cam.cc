@@ -65,7 +65,10 @@ std::string ReadWholeFile(const std::string& path) {
   while (file.read(buffer.data(), buffer.size()) || file.gcount() > 0) {
     text.append(buffer.data(), static_cast<std::size_t>(file.gcount()));
   }
-  if (file.bad()) throw IOError("Unable to read '" + path + "': " + SystemText(errno));
+  if (file.bad()) {
+    const std::string reason = SystemText(errno);
+    throw IOError("Unable to read '" + path + "': " + reason);
+  }
   return text;
 }
 

@@ -6,12 +6,19 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <cerrno>
+#include <utility>
+#include <vector>
+
 #include "common/paths.h"
 #include "common/smb_conf.h"
 #include "support/files.h"
+#include "support/interpose.h"
 
 namespace sambaprovider {
 namespace {
+
+namespace calls = testsupport::calls;
 
 class BeforeJoinTest : public testing::Test {
  protected:
@@ -55,13 +62,31 @@ TEST_F(BeforeJoinTest, FilesGetTheirOwnersBack) {
   static_cast<void>(!chown(paths::kKeytab, 12, 34));
   struct stat before {};
   ASSERT_EQ(stat(paths::kKeytab, &before), 0);
+  using Owner = std::pair<uid_t, gid_t>;
+  std::vector<Owner> given;
+  const testsupport::TakeOver watch(calls::fchown, [&given](int file, uid_t owner, gid_t group) {
+    given.emplace_back(owner, group);
+    return calls::fchown.Real(file, owner, group);
+  });
   before_join::PutAside();
   testsupport::RemoveFile(paths::kKeytab);
   before_join::GiveBack();
+  EXPECT_EQ(given, std::vector<Owner>(2, {before.st_uid, before.st_gid}));
   struct stat after {};
   ASSERT_EQ(stat(paths::kKeytab, &after), 0);
-  EXPECT_EQ(after.st_uid, before.st_uid);
-  EXPECT_EQ(after.st_gid, before.st_gid);
+  EXPECT_EQ(Owner(after.st_uid, after.st_gid), Owner(before.st_uid, before.st_gid));
+}
+
+TEST_F(BeforeJoinTest, OwnerThatIsUnknownHereIsNoObstacle) {
+  testsupport::WriteFile(paths::kKeytab, "key");
+  const testsupport::TakeOver refuse(calls::fchown, [](int, uid_t, gid_t) {
+    errno = EINVAL;
+    return -1;
+  });
+  before_join::PutAside();
+  testsupport::RemoveFile(paths::kKeytab);
+  before_join::GiveBack();
+  EXPECT_EQ(testsupport::ReadFile(paths::kKeytab), "key");
 }
 
 TEST_F(BeforeJoinTest, FilesThatWereNotThereAreRemoved) {

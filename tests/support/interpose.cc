@@ -67,6 +67,7 @@ constinit Interposed<hostent*(const char*)> gethostbyname("gethostbyname");
 constinit Interposed<int(const char*, struct stat*)> stat("stat");
 constinit Interposed<int(const char*, const char*)> rename("rename");
 constinit Interposed<int(const char*, mode_t)> chmod("chmod");
+constinit Interposed<int(int, uid_t, gid_t)> fchown("fchown");
 constinit Interposed<int(char*)> mkstemp("mkstemp");
 constinit Interposed<int(int)> fsync("fsync");
 constinit Interposed<void*(const char*, int)> dlopen("dlopen");
@@ -121,6 +122,10 @@ INTERPOSED int rename(const char* from, const char* to) noexcept {
 
 INTERPOSED int chmod(const char* path, mode_t mode) noexcept {
   return calls::chmod.Call(path, mode);
+}
+
+INTERPOSED int fchown(int file, uid_t owner, gid_t group) noexcept {
+  return calls::fchown.Call(file, owner, group);
 }
 
 INTERPOSED int mkstemp(char* pattern) {

@@ -100,6 +100,7 @@ extern Interposed<hostent*(const char*)> gethostbyname;
 extern Interposed<int(const char*, struct stat*)> stat;
 extern Interposed<int(const char*, const char*)> rename;
 extern Interposed<int(const char*, mode_t)> chmod;
+extern Interposed<int(int, uid_t, gid_t)> fchown;
 extern Interposed<int(char*)> mkstemp;
 extern Interposed<int(int)> fsync;
 extern Interposed<void*(const char*, int)> dlopen;

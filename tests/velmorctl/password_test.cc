@@ -224,6 +224,7 @@ TEST_F(PasswordTest, IsWipedFromMemoryAfterTheJoin) {
 TEST_F(PasswordTest, IsInNoCoreFile) {
   rlimit size = {};
   ASSERT_EQ(getrlimit(RLIMIT_CORE, &size), 0);
+  ASSERT_NE(size.rlim_max, 0U) << "no process may leave a core file here";
   size.rlim_cur = size.rlim_max;
   ASSERT_EQ(setrlimit(RLIMIT_CORE, &size), 0);
   Script("hang.joinDomain", "");

@@ -54,6 +54,8 @@ std::string HowItEnded(const std::exception_ptr& failure) {
            exception.what();
   } catch (const std::exception& exception) {
     return std::string("the leave had failed by then: ") + exception.what();
+  } catch (...) {
+    return "the leave had failed by then";
   }
 }
 

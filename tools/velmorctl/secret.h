@@ -15,6 +15,10 @@ class Secret {
   /// The greatest number of characters.
   static constexpr std::size_t maximumLength = 4000;
 
+  Secret() = default;
+  Secret(const Secret&) = delete;
+  Secret& operator=(const Secret&) = delete;
+
   /// Appends a character; false when the text is full.
   bool Append(char character);
   void RemoveLast();

@@ -113,7 +113,8 @@ bool CopyFile(const std::string& from, const std::string& to) {
   TemporaryFile temporary(to);
   WriteAll(temporary.Descriptor(), ReadAll(file.Get(), from), to);
   // The mode comes last, since a change of owner takes some of its bits away.
-  if (fchown(temporary.Descriptor(), original.st_uid, original.st_gid) != 0)
+  // EINVAL: the owner is one that this user namespace does not know, so that nothing here can be his.
+  if (fchown(temporary.Descriptor(), original.st_uid, original.st_gid) != 0 && errno != EINVAL)
     Fail("set the owner of", to, errno);
   if (fchmod(temporary.Descriptor(), original.st_mode & 07777) != 0) Fail("set the mode of", to, errno);
   temporary.Place(to);

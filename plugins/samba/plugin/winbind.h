@@ -33,8 +33,9 @@ struct TrustedDomain {
   bool online = false;
 };
 
-/// Whether this is the list of a winbindd that has not asked a controller for the trusted domains since it
-/// was started, so that nothing follows from what is missing in it.
+/// Whether this may be the list of a winbindd that has not asked a controller for the trusted domains since
+/// it was started, so that nothing follows from what is missing in it. That of a domain without trusts whose
+/// controllers do not answer looks the same.
 bool IsBeforeLearning(const std::vector<TrustedDomain>& domains);
 
 /// All domains but the host's own set of accounts and BUILTIN; the joined domain is among them. Waits some
