@@ -2,7 +2,9 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <ctime>
+#include <functional>
 
 #include "support/files.h"
 
@@ -17,17 +19,23 @@ class UnusedAccountsTest : public ::testing::Test {
     settings_.passwordFile = folder_.Path() + "absent";
     settings_.removeUnusedAfter = std::chrono::hours(1);
     audit_.Open(auditFile_);
-    const int64_t id = ledger_.Begin({"HOST1", "host1.corp.example", "", "10.0.0.1", ""}, old_, 0, 0).value();
+    GiveOldAccount("HOST1", "S-1");
+  }
+
+  void GiveOldAccount(const std::string& computer, const std::string& sid) {
+    const int64_t id =
+        ledger_.Begin({computer, computer + ".corp.example", "", "10.0.0.1", ""}, old_, 0, 0).value();
     GivenAccount account;
-    account.sid = "S-1";
+    account.sid = sid;
     ledger_.Give(id, account, old_);
   }
 
   std::string Audited() {
-    RemoveUnusedAccounts(settings_, ledger_, directory_, creation_, audit_);
+    RemoveUnusedAccounts(settings_, ledger_, directory_, creation_, audit_, isEnding_);
     return testsupport::ReadFile(auditFile_);
   }
 
+  std::function<bool()> isEnding_ = [] { return false; };
   const int64_t old_ = time(nullptr) - 7200;
   testsupport::ScratchFolder folder_;
   const std::string auditFile_ = folder_.Path() + "audit.log";
@@ -39,6 +47,10 @@ class UnusedAccountsTest : public ::testing::Test {
   AuditLog audit_;
 };
 
+std::ptrdiff_t LinesOf(const std::string& text) {
+  return std::count(text.begin(), text.end(), '\n');
+}
+
 TEST_F(UnusedAccountsTest, OldAccountIsLookedAt) {
   EXPECT_NE(Audited().find("HOST1"), std::string::npos);
 }
@@ -46,6 +58,19 @@ TEST_F(UnusedAccountsTest, OldAccountIsLookedAt) {
 TEST_F(UnusedAccountsTest, AccountWhoseNameIsJustAskedForIsLeftAlone) {
   const auto reservation = creation_.Reserve("HOST1");
   EXPECT_EQ(Audited(), "");
+}
+
+TEST_F(UnusedAccountsTest, ServiceThatIsEndingLooksAtNoAccount) {
+  isEnding_ = [] { return true; };
+  EXPECT_EQ(Audited(), "");
+}
+
+TEST_F(UnusedAccountsTest, EndInTheMiddleLeavesTheOtherAccountsForTheNextTime) {
+  GiveOldAccount("HOST2", "S-2");
+  isEnding_ = [this] { return !testsupport::ReadFile(auditFile_).empty(); };
+  EXPECT_EQ(LinesOf(Audited()), 1);
+  isEnding_ = [] { return false; };
+  EXPECT_EQ(LinesOf(Audited()), 3);
 }
 
 TEST_F(UnusedAccountsTest, NameIsFreeAgainAfterwards) {

@@ -4,6 +4,7 @@
 #include <sys/prctl.h>
 #include <syslog.h>
 
+#include <atomic>
 #include <condition_variable>
 #include <mutex>
 #include <thread>
@@ -85,12 +86,15 @@ class Service {
     handler.Configure(configuration_);
     WebServer server(started_, ReadPublicFile(started_.certificateFile), ReadCredentialFile(started_.keyFile),
                      handler);
-    const Repetition removal(kTimeBetweenRemovals, [this] {
-      RemoveUnusedAccounts(Current()->directory, ledger_, directory_, creation_, audit_);
+    std::atomic<bool> ending = false;
+    const Repetition removal(kTimeBetweenRemovals, [this, &ending] {
+      RemoveUnusedAccounts(Current()->directory, ledger_, directory_, creation_, audit_,
+                           [&ending] { return ending.load(); });
     });
     syslog(LOG_INFO, "serving %s port %u", started_.listenAddress.c_str(), started_.port);
     TellReady();
     for (int signal = 0; sigwait(&signals, &signal) == 0 && signal == SIGHUP;) Reload(handler);
+    ending = true;
     syslog(LOG_INFO, "stopping; requests under way are finished");
     TellStopping();
     handler.RefuseFurther();

@@ -44,11 +44,12 @@ bool RemoveOne(const DirectorySettings& settings, const LedgerEntry& entry, Ledg
 }  // namespace
 
 void RemoveUnusedAccounts(const DirectorySettings& settings, Ledger& ledger, DirectoryClient& directory,
-                          AccountCreation& creation, AuditLog& audit) {
+                          AccountCreation& creation, AuditLog& audit, const std::function<bool()>& isEnding) {
   if (settings.removeUnusedAfter.count() == 0) return;
   try {
     const int64_t age = std::chrono::seconds(settings.removeUnusedAfter).count();
     for (const LedgerEntry& entry : ledger.FindOlderThan(time(nullptr) - age)) {
+      if (isEnding()) return;
       const auto reservation = creation.Reserve(entry.computer);
       if (!reservation) continue;
       // Since the list was read the name may have been given out anew.
