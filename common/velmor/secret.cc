@@ -13,7 +13,11 @@ Secret::Secret(std::string_view text) : Secret(text.size()) {
   std::copy(text.begin(), text.end(), data_);
 }
 
-Secret::Secret(std::size_t size) : size_(size), mappedSize_(size + 1) {
+Secret::Secret(std::size_t size) {
+  // Many a request brings no secret; that is not worth a page and three system calls.
+  if (size == 0) return;
+  size_ = size;
+  mappedSize_ = size + 1;
   void* const memory = mmap(nullptr, mappedSize_, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
   if (memory == MAP_FAILED) throw std::bad_alloc();
   data_ = static_cast<char*>(memory);

@@ -9,7 +9,7 @@ namespace velmor {
 
 /// Owns bytes, followed by a zero byte, in memory of their own: it is left out of core files, of swap where
 /// the system allows it, and is wiped before it is given back. It never grows, so that no unwiped copy stays
-/// behind. Movable, not copyable. For one thread at a time.
+/// behind. An empty one takes no memory. Movable, not copyable. For one thread at a time.
 class Secret {
  public:
   Secret() = default;
@@ -23,6 +23,7 @@ class Secret {
   Secret& operator=(const Secret&) = delete;
   ~Secret();
 
+  /// Null when it is empty from the start.
   char* Data() { return data_; }
   const char* Text() const { return data_ == nullptr ? "" : data_; }
   std::size_t Size() const { return size_; }

@@ -22,6 +22,12 @@ TEST(SecretTest, TextIsFollowedByAZeroByte) {
 TEST(SecretTest, EmptyOneIsATextToo) {
   EXPECT_STREQ(Secret().Text(), "");
   EXPECT_STREQ(Secret(0).Text(), "");
+  EXPECT_STREQ(Secret(std::string_view()).Text(), "");
+}
+
+TEST(SecretTest, EmptyOneTakesNoMemory) {
+  EXPECT_EQ(Secret(0).Data(), nullptr);
+  EXPECT_EQ(Secret(std::string_view()).Data(), nullptr);
 }
 
 TEST(SecretTest, RoomIsZero) {
