@@ -287,7 +287,11 @@ class ConfigurationTest(unittest.TestCase):
     def testValueThatMeansNothingIsNamedWithItsLine(self):
         for section, key, value in (("server", "listen-address", "everywhere"), ("server", "ledger-file", ""),
                                     ("server", "ledger-file", ":memory:"), ("server", "ledger-file", "ledger.db"),
-                                    ("server", "audit-file", "audit.log"), ("directory", "domain", "corp example"),
+                                    ("server", "audit-file", "audit.log"),
+                                    ("server", "certificate-file", "certs/camd.pem"),
+                                    ("server", "key-file", "certs/camd.key"),
+                                    ("directory", "password-file", "./password"),
+                                    ("directory", "domain", "corp example"),
                                     ("directory", "controller", "dc1/x"), ("directory", "user", "CORP\\camsvc"),
                                     ("directory", "user", "camsvc@corp.example"), ("directory", "helper", ""),
                                     ("directory", "helper", "velmor-camd-helper")):

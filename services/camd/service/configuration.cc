@@ -150,6 +150,11 @@ std::string FaultOfPath(const std::string& text) {
   return text.starts_with('/') ? "" : "\"" + text + "\" is no whole path, which begins with \"/\"";
 }
 
+// A name without a slash is that of a credential.
+std::string FaultOfCredential(const std::string& text) {
+  return text.find('/') == std::string::npos ? "" : FaultOfPath(text);
+}
+
 // An empty text stands for no file.
 std::string FaultOfPathIfAny(const std::string& text) {
   return text.empty() ? "" : FaultOfPath(text);
@@ -161,7 +166,9 @@ void TakeServer(Section section, Configuration& result) {
   section.Require("listen-address", server.listenAddress, FaultOfListenAddress);
   section.TakeNumber("port", server.port, 1, 65535);
   section.TakeRequired("certificate-file", server.certificateFile);
+  section.Require("certificate-file", server.certificateFile, FaultOfCredential);
   section.TakeRequired("key-file", server.keyFile);
+  section.Require("key-file", server.keyFile, FaultOfCredential);
   section.Take("ledger-file", server.ledgerFile);
   section.Require("ledger-file", server.ledgerFile, FaultOfPath);
   section.Take("audit-file", result.auditFile);
@@ -182,6 +189,7 @@ void TakeDirectory(Section section, DirectorySettings& directory) {
   section.TakeRequired("user", directory.user);
   section.Require("user", directory.user, FaultOfUser);
   section.TakeRequired("password-file", directory.passwordFile);
+  section.Require("password-file", directory.passwordFile, FaultOfCredential);
   section.Take("default-container", directory.defaultContainer);
   section.TakeChoice<ExistingAccounts>("existing-accounts", directory.existingAccounts,
                                        {{"refuse", ExistingAccounts::kRefuse},
