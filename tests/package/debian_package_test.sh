@@ -23,9 +23,14 @@ for needed in winbind samba-common samba-common-bin libsasl2-modules-gssapi-mit 
 done
 
 for pattern in usr/bin/velmorctl 'usr/lib/*/libvelmor.so.1' usr/libexec/velmor/libsamba.so \
-  usr/libexec/velmor/velmor-samba-helper usr/libexec/velmor/velmor-samba-precheck \
+  usr/libexec/velmor/libcam.so usr/libexec/velmor/velmor-samba-helper usr/libexec/velmor/velmor-samba-precheck \
+  usr/sbin/velmor-camd usr/lib/systemd/system/velmor-camd.service usr/lib/sysusers.d/velmor-camd.conf \
   usr/share/man/man8/velmorctl.8 usr/include/authentication/authentication.h; do
   compgen -G "$folder/content/$pattern" >/dev/null || complain "it lacks $pattern"
+done
+
+for script in postinst prerm; do
+  [[ -x $folder/control/$script ]] || complain "it lacks $script, or that cannot be run"
 done
 
 # What an administrator may have changed must survive an upgrade.
