@@ -303,6 +303,15 @@ TEST_F(CamCommandTest, JoinAtAServerWithAnotherCertificateIsRefused) {
   EXPECT_FALSE(Called(JOIN_CALL));
 }
 
+TEST_F(CamCommandTest, NameThatIsBusyMayBeThatOfAnAccountThatIsBeingRemoved) {
+  Trust();
+  TlsServer busy(identity_, ServiceWithCreation(HttpAnswer("409 Conflict", R"({"status": 1061})")));
+  UsePort(busy.Port());
+  EXPECT_NE(JoinThroughProxy().errors.find(
+                "  try:      an account of this name is being created or removed: try again in a minute\n"),
+            std::string::npos);
+}
+
 TEST_F(CamCommandTest, FailureOfTheProviderIsTheProvidersAffair) {
   Trust();
   Script("status.joinDomainWithMachineAccount", "1064");

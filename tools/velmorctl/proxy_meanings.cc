@@ -38,7 +38,7 @@ constexpr CodeRow codeRows[] = {
     {87, {ExitCode::Proxy, askOperator}},
     {170, {ExitCode::Proxy, "the service is busy: try again later"}},
     {267, {ExitCode::Proxy, "give a --container that exists and that the service may write"}},
-    {1061, {ExitCode::Proxy, "the account is being created: try again in a minute"}},
+    {1061, {ExitCode::Proxy, "an account of this name is being created or removed: try again in a minute"}},
     {1064, {ExitCode::Proxy, "the system log names the fault in /etc/quenix/velmor/cam.conf"}},
     {1210, {ExitCode::Proxy, checkName}},
     {1225, {ExitCode::Proxy, checkWay}},
