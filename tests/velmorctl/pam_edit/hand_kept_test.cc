@@ -326,6 +326,31 @@ TEST_F(PamHandKeptTest, AServiceThatCannotBeProvedKeepsWhatItShares) {
   EXPECT_TRUE(Has("ppp", "pam_ctlscript"));
 }
 
+TEST_F(PamHandKeptTest, AServiceThatLetsNoUserOfTheDirectoryInAnywayStaysAsItIs) {
+  const std::string text =
+      "auth required pam_localuser.so\nauth required pam_unix.so\naccount required pam_unix.so\n"
+      "session required pam_unix.so\n";
+  root_.Write("/etc/pam.d/localonly", text);
+  const Outcome outcome = root_.Pam({"enable"});
+  EXPECT_EQ(outcome.exitCode, NOT_READY);
+  EXPECT_PRED2(Contains, outcome.errors, "a user of the directory would still not get in");
+  EXPECT_EQ(root_.Read("/etc/pam.d/localonly"), text);
+}
+
+TEST_F(PamHandKeptTest, EnablingAgainTakesNoLineOutOfAServiceThatIsRefused) {
+  WriteShape(root_, PLAIN);
+  ASSERT_EQ(root_.Pam({"enable"}).exitCode, 0);
+  std::string text = root_.Read("/etc/pam.d/ppp");
+  text.replace(text.find("auth required pam_unix"), 13, "auth optional");
+  root_.Write("/etc/pam.d/ppp", text);
+  const Tree before = root_.Files();
+  const Outcome outcome = root_.Pam({"enable"});
+  EXPECT_EQ(outcome.exitCode, NOT_READY);
+  EXPECT_PRED2(Contains, outcome.errors, "the service 'ppp' cannot keep what was put into its files");
+  EXPECT_PRED2(Contains, outcome.errors, "leaves no place beside it");
+  EXPECT_EQ(root_.Files(), before);
+}
+
 TEST_F(PamHandKeptTest, AFileOfAPackageIsNotEdited) {
   const std::string text = "auth required pam_unix.so\naccount required pam_unix.so\n";
   root_.Write("/usr/lib/pam.d/vendor", text);

@@ -88,6 +88,44 @@ TEST_F(PamProfileTest, EnablingTwiceChangesNothing) {
   EXPECT_EQ(root_.Files(), before);
 }
 
+const std::string LOCAL_ONLY =
+    "auth required pam_localuser.so\n@include common-auth\n@include common-account\n"
+    "@include common-session\n";
+
+TEST_F(PamProfileTest, AServiceForLocalUsersOnlyHoldsUpNoOther) {
+  root_.Write("/etc/pam.d/localonly", LOCAL_ONLY);
+  const Outcome outcome = root_.Pam({"enable"});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.errors;
+  EXPECT_PRED2(Contains, outcome.errors,
+               "note: the service 'localonly' shares changed files with others, but a user of the directory "
+               "would still not get in");
+  EXPECT_TRUE(root_.LetsIn("sshd", "dora", "up"));
+  EXPECT_FALSE(root_.LetsIn("localonly", "dora", "up"));
+}
+
+TEST_F(PamProfileTest, EnablingAgainBesideANewServiceForLocalUsersOnlyChangesNothing) {
+  ASSERT_EQ(root_.Pam({"enable"}).exitCode, 0);
+  root_.Write("/etc/pam.d/localonly", LOCAL_ONLY);
+  const Tree before = root_.Files();
+  const Outcome outcome = root_.Pam({"enable"});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.errors;
+  EXPECT_EQ(root_.Files(), before);
+}
+
+TEST_F(PamProfileTest, EnablingAgainDoesNotTakeTheProfileOutForAServiceThatIsRefused) {
+  ASSERT_EQ(root_.Pam({"enable"}).exitCode, 0);
+  // The jump of this one counts the lines of the file that it passes over.
+  root_.Write("/etc/pam.d/jumping",
+              "auth [success=5 default=ignore] pam_userdb.so\nauth include common-auth\n"
+              "auth required pam_deny.so\nauth required pam_permit.so\naccount include common-account\n");
+  const Tree before = root_.Files();
+  const Outcome outcome = root_.Pam({"enable"});
+  EXPECT_EQ(outcome.exitCode, NOT_READY);
+  EXPECT_PRED2(Contains, outcome.errors, "the service 'jumping' cannot keep what was put into its files");
+  EXPECT_PRED2(Contains, outcome.errors, "a jump of this entry would lead to another one");
+  EXPECT_EQ(root_.Files(), before);
+}
+
 TEST_F(PamProfileTest, DisablingWhatWasNotEnabledChangesNothing) {
   const Tree before = root_.Files();
   EXPECT_EQ(root_.Pam({"diff", "--disable"}).exitCode, 0);

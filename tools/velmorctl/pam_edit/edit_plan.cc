@@ -88,7 +88,7 @@ std::string Place(const Origin& origin) {
 class EnablePlanner {
  public:
   EnablePlanner(const RootFolder& root, const DirectoryModule& module)
-      : module_(module), bare_(WithoutOwn(Draft(root))), policies_(ResolveAll(bare_)) {}
+      : module_(module), current_(root), bare_(WithoutOwn(current_)), policies_(ResolveAll(bare_)) {}
 
   EditPlan Run() {
     Choose();
@@ -96,6 +96,8 @@ class EnablePlanner {
       Draft next = Draw();
       std::vector<Refusal> refused = Prove(next);
       if (refused.empty()) {
+        RequireKept(next);
+        NoteShutOut(next);
         return {std::move(next), std::move(notes_), std::move(refusals_)};
       }
       for (Refusal& refusal : refused) {
@@ -201,24 +203,85 @@ class EnablePlanner {
         refused.push_back({before.service, reason});
       }
     }
+    if (refused.empty()) {
+      refused = ShutOutServices(next);
+      std::vector<Refusal> all = refused;
+      std::erase_if(refused, [&](const Refusal& refusal) { return ServesOthers(refusal.service, all); });
+    }
     return refused;
+  }
+
+  const Meant* FindMeant(const std::string& service) const {
+    auto found = std::find_if(meant_.begin(), meant_.end(),
+                              [&service](const Meant& meant) { return meant.service == service; });
+    return found == meant_.end() ? nullptr : &*found;
+  }
+
+  /// The services that would be changed to no avail.
+  std::vector<Refusal> ShutOutServices(const Draft& next) const {
+    std::vector<Refusal> shutOut;
+    FileReader reader = next.Reader();
+    for (const Meant& meant : meant_) {
+      const Policy& before = PolicyOf(meant.service);
+      std::string reason = ShutOut(before, ResolvePolicy(meant.service, reader), module_.name);
+      if (!reason.empty()) {
+        shutOut.push_back({meant.service, reason});
+      }
+    }
+    return shutOut;
+  }
+
+  /// Whether a file that would be changed for the service is one that lets people in elsewhere. Leaving it
+  /// alone would take the directory from services that have nothing to do with this one.
+  bool ServesOthers(const std::string& service, const std::vector<Refusal>& shutOut) const {
+    const std::vector<EditSpot>& spots = FindMeant(service)->spots;
+    return std::any_of(meant_.begin(), meant_.end(), [&](const Meant& other) {
+      bool isShutOut = std::any_of(shutOut.begin(), shutOut.end(), [&other](const Refusal& refusal) {
+        return refusal.service == other.service;
+      });
+      return !isShutOut && std::any_of(spots.begin(), spots.end(), [&other](const EditSpot& spot) {
+        return std::any_of(other.spots.begin(), other.spots.end(),
+                           [&spot](const EditSpot& its) { return its.file == spot.file; });
+      });
+    });
+  }
+
+  void NoteShutOut(const Draft& next) {
+    for (const Refusal& refusal : ShutOutServices(next)) {
+      AddNote("the service '" + refusal.service + "' shares changed files with others, but " +
+              refusal.reason + ".");
+    }
+  }
+
+  /// A refused service is to stay as it is: what an earlier "enable" has put in must not go by the way.
+  void RequireKept(const Draft& next) const {
+    bool profileGoes = !ModulesOfProfile(current_).empty() && ModulesOfProfile(next).empty();
+    // Behind the services that share files with it stands the one that is the reason.
+    for (auto refusal = refusals_.rbegin(); refusal != refusals_.rend(); ++refusal) {
+      for (const std::string& file : FilesOf(PolicyOf(refusal->service))) {
+        bool linesGo = ModulesOfOwnLines(next.Content(file).value_or("")).size() <
+                       ModulesOfOwnLines(current_.Content(file).value_or("")).size();
+        if (linesGo || (profileGoes && IsKeptByProfiles(bare_, file))) {
+          throw Failure(ExitCode::HostNotReady,
+                        "the service '" + refusal->service + "' cannot keep what was put into its files")
+              .Detail("file", bare_.Root().Shown(file))
+              .Detail("reason", refusal->reason)
+              .Try("correct or remove the service; nothing was changed");
+        }
+      }
+    }
   }
 
   /// Why the service must not become what it would; else empty.
   std::string ProblemOf(const Policy& before, const Policy& after, const Draft& next) const {
-    bool meant = std::any_of(meant_.begin(), meant_.end(),
-                             [&before](const Meant& other) { return other.service == before.service; });
-    if (!meant && !IsChanged(before, after)) {
+    if (FindMeant(before.service) == nullptr && !IsChanged(before, after)) {
       return {};
     }
     std::string problem = UnexpectedDifference(before, after, {module_.name});
     if (problem.empty()) {
       problem = ProblemOfFiles(before, next);
     }
-    if (problem.empty()) {
-      problem = UnsafeChange(before, after, module_.name);
-    }
-    return problem.empty() && meant ? ShutOut(before, after, module_.name) : problem;
+    return problem.empty() ? UnsafeChange(before, after, module_.name) : problem;
   }
 
   std::string ProblemOfFiles(const Policy& policy, const Draft& next) const {
@@ -267,6 +330,7 @@ class EnablePlanner {
   }
 
   const DirectoryModule& module_;
+  Draft current_;
   Draft bare_;
   Policies policies_;
   std::vector<Meant> meant_;

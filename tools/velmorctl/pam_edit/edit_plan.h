@@ -25,8 +25,9 @@ struct EditPlan {
 
 /// Plans to put the module into each service that people log in through: by its profile where
 /// pam-auth-update keeps the files, and else beside the local users' module. What was put in before and is
-/// not meant any more goes. Each service is proved, and stays as it is when the proof fails. Throws Failure
-/// when nothing can be planned.
+/// not meant any more goes. Each service is proved, and stays as it is when the proof fails. A service that
+/// would let no user of the directory in all the same does not hold up those that share its files. Throws
+/// Failure when nothing can be planned, or when a service that is refused would lose what was put in before.
 EditPlan PlanEnable(const RootFolder& root, const DirectoryModule& module);
 
 /// Plans to take out what PlanEnable has put in, byte for byte. `module` is the provider's, if it is known;
