@@ -5,14 +5,22 @@
 namespace velmorctl {
 
 std::string Printable(std::string_view text) {
-  std::string result(text);
-  for (char& character : result) {
-    auto value = static_cast<unsigned char>(character);
-    if (value < 0x20 || value == 0x7f) {
-      character = '?';
-    }
+  std::string result;
+  for (std::size_t index = 0; index < text.size();) {
+    const std::size_t size = ControlCharacterAt(text, index);
+    result += size > 0 ? '?' : text[index];
+    index += size > 0 ? size : 1;
   }
   return result;
+}
+
+std::size_t ControlCharacterAt(std::string_view text, std::size_t index) {
+  const auto byte = static_cast<unsigned char>(text[index]);
+  const auto next = index + 1 < text.size() ? static_cast<unsigned char>(text[index + 1]) : 0;
+  if (byte == 0xc2 && next >= 0x80 && next <= 0x9f) {
+    return 2;
+  }
+  return byte < 0x20 || byte == 0x7f ? 1 : 0;
 }
 
 std::string SystemErrorText(int errorNumber) {

@@ -303,6 +303,15 @@ TEST_F(ProviderWithParametersTest, HasThemBehindItsService) {
   ExpectIn(ReadFile(SWITCH_FILE), "passwd:         files some [UNAVAIL=continue TRYAGAIN=return]\n");
 }
 
+TEST_F(ProviderWithParametersTest, HasADifferenceWithoutThem) {
+  Install("parameters");
+  WriteFile(SWITCH_FILE, "passwd: files some\ngroup: files some\n");
+  const Outcome outcome = Velmorctl({"nss", "diff"});
+  EXPECT_EQ(outcome.exitCode, 11);
+  ExpectIn(outcome.errors,
+           "  line:     1\n  reason:   the provider needs [UNAVAIL=continue TRYAGAIN=return]");
+}
+
 TEST_F(ProviderWithParametersTest, HasThemNotBehindAnotherService) {
   Install("parameters");
   Velmorctl({"nss", "add", "passwd", "winbind"});
@@ -438,6 +447,35 @@ TEST_F(NameServiceTest, ShowsNoControlCharactersOfTheFile) {
   const std::string output = Velmorctl({"nss", "add", "passwd", "winbind", "--dry-run"}).output;
   ExpectIn(output, "+passwd: files winbind^M\n hosts: files^?^M\n");
   EXPECT_EQ(output.find('\r'), std::string::npos);
+}
+
+TEST_F(NameServiceTest, ChangesNothingThatItCannotShow) {
+  const Outcome outcome = Velmorctl({"nss", "add", "passwd", "winbind"}, WithOutputTo("/dev/full"));
+  EXPECT_EQ(outcome.exitCode, 1);
+  ExpectIn(outcome.errors, "cannot write the output");
+  ExpectIn(outcome.errors, "  changed:  nothing\n");
+  EXPECT_EQ(ReadFile(SWITCH_FILE), StockFiles().front().text);
+  EXPECT_TRUE(Backups().empty());
+}
+
+TEST_F(NameServiceTest, ShowsNoControlCharactersOfTheRoot) {
+  const testsupport::ScratchFolder scratch;
+  const std::string root = scratch.Path() + "a\x1b\xc2\x9b" + "b";
+  MakeFolders(root + "/etc");
+  WriteFile(root + "/etc/nsswitch.conf", "passwd: files nosuch\n");
+  ExpectIn(Velmorctl({"nss", "add", "passwd", "winbind", "--root", root}).output,
+           " --root " + scratch.Path() + "a??b\n");
+}
+
+TEST_F(NameServiceTest, NamesTheRootInARemedy) {
+  const testsupport::ScratchFolder root;
+  MakeFolders(root.Path() + "etc");
+  MakeFolders(root.Path() + "usr/lib/x86_64-linux-gnu");
+  WriteFile(root.Path() + "usr/lib/x86_64-linux-gnu/libnss_files.so.2", "");
+  WriteFile(root.Path() + "etc/nsswitch.conf", "passwd: files nosuch\n");
+  const std::string folder = root.Path().substr(0, root.Path().size() - 1);
+  ExpectIn(Velmorctl({"nss", "check", "--root", folder}).output,
+           "velmorctl nss remove passwd nosuch --root " + folder + "\n");
 }
 
 TEST_F(NameServiceTest, ReportsAWriteThatFailsAndLeavesTheFile) {

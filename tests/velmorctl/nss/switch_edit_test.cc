@@ -116,6 +116,38 @@ TEST(AddServiceWarningTest, IsNotGivenForBracketsThatGoOn) {
   EXPECT_TRUE(Add("group: files [SUCCESS=merge] systemd\n", "group", "winbind").warnings.empty());
 }
 
+TEST(AddServiceWarningTest, TellsThatLocalAccountsAreNotRead) {
+  EXPECT_EQ(Add("passwd: sss\n", "passwd", "winbind").warnings,
+            (std::vector<std::string>{
+                "\"passwd\" has neither \"files\" nor \"compat\", so that no local account is found"}));
+}
+
+TEST(AddServiceWarningTest, IsNotGivenForLocalFilesThatAreAdded) {
+  EXPECT_TRUE(Add("passwd: sss\n", "passwd", "files").warnings.empty());
+  EXPECT_TRUE(Add("passwd:\n", "passwd", "winbind").warnings.empty());
+}
+
+TEST(AddServiceBeforeLocalFilesTest, NamesTheServiceToStandBehind) {
+  EXPECT_EQ(FailureOf([] { Add("group: sss compat\n", "group", "winbind", "sss"); }).Advice(),
+            "put it behind the local files, with --after compat or without --after");
+}
+
+TEST(AddServiceThatIsThereTest, IsRefusedWhenItsBracketsMeanSomethingElse) {
+  for (const char* line : {"passwd: files some\n", "passwd: files some [TRYAGAIN=continue]\n"}) {
+    const Failure failure = FailureOf([&] {
+      velmorctl::AddService(SwitchFile(line), "", "passwd", {"some", {"TRYAGAIN=return"}}, "");
+    });
+    EXPECT_EQ(failure.Code(), ExitCode::Configuration);
+    EXPECT_EQ(DetailOf(failure, "reason"), "the provider needs [TRYAGAIN=return] behind it");
+  }
+}
+
+TEST(AddServiceThatIsThereTest, StaysWhenItsBracketsMeanTheSame) {
+  const std::string line = "passwd: files some [tryagain=RETURN UNAVAIL=continue]\n";
+  EXPECT_EQ(velmorctl::AddService(SwitchFile(line), "", "passwd", {"some", {"TRYAGAIN=return"}}, "").content,
+            line);
+}
+
 struct Removal {
   const char* name;
   std::string before;
@@ -190,6 +222,8 @@ INSTANTIATE_TEST_SUITE_P(
                 ExitCode::Usage},
         Refusal{"TakesCompatAway", "shadow: compat sss\n", "remove", "shadow", "compat", "", ExitCode::Usage},
         Refusal{"StandsBehindWhatIsNotThere", "passwd: files\n", "add", "passwd", "winbind", "sss",
+                ExitCode::Usage},
+        Refusal{"StandsBeforeFiles", "passwd: sss files\n", "add", "passwd", "winbind", "sss",
                 ExitCode::Usage},
         Refusal{"StandsBehindWhatIsNoDefault", "group: files\n", "add", "passwd", "winbind", "sss",
                 ExitCode::Usage},

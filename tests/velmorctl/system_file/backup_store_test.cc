@@ -107,6 +107,19 @@ TEST_F(BackupStoreTest, LeavesNoTraceOfABackupThatFails) {
   EXPECT_EQ(testsupport::NamesIn(kept_ + "nss"), std::vector<std::string>{before});
 }
 
+TEST_F(BackupStoreTest, RefusesAFileWhoseNameTheListCannotHold) {
+  velmorctl::Snapshot oddlyNamed;
+  oddlyNamed.name = "/etc/\xff\n";
+  const Failure failure = FailureOf([&] { store_.Write("nss add x y", {oddlyNamed}); });
+  EXPECT_EQ(failure.Code(), ExitCode::Configuration);
+  EXPECT_EQ(DetailOf(failure, "file"), "/etc/\xff?");
+  EXPECT_EQ(failure.Advice(), "rename it");
+}
+
+TEST_F(BackupStoreTest, IsWrittenForACommandThatTheListCannotHold) {
+  EXPECT_EQ(store_.Read(store_.Write("nss add \xff y", {})).command, "nss add \xef\xbf\xbd y");
+}
+
 TEST_F(BackupStoreTest, NamesTheBackupsThatThereAre) {
   const std::string id = Write();
   const Failure failure = FailureOf([&] { store_.Read("20200101T000000Z"); });
@@ -212,6 +225,23 @@ TEST_F(RestoreTest, TakesTheNewestBackup) {
   EXPECT_EQ(ReadFile(folder_ + "file"), "newer\n");
   Restore(older);
   EXPECT_EQ(ReadFile(folder_ + "file"), "text\n");
+}
+
+TEST_F(RestoreTest, ChangesNothingTheSecondTime) {
+  Write();
+  WriteFile(folder_ + "file", "changed\n");
+  Restore();
+  EXPECT_TRUE(velmorctl::PlanRestore(root_, "nss", "").ChangesNothing());
+}
+
+TEST_F(RestoreTest, NeedsAnIdWhenOnlyBackupsOfRestoresAreLeft) {
+  const std::string first = Write();
+  WriteFile(folder_ + "file", "changed\n");
+  const std::string second = Restore();
+  store_.Remove(first);
+  const Failure failure = FailureOf([&] { Restore(); });
+  EXPECT_EQ(failure.Code(), ExitCode::Configuration);
+  EXPECT_EQ(failure.Advice(), "give the ID of one that a restore has left: " + second);
 }
 
 TEST_F(RestoreTest, CanBeUndone) {

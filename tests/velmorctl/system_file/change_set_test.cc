@@ -72,6 +72,19 @@ int FailToWrite(const char*, const char*) {
   return -1;
 }
 
+/// Does something once the backup is complete and before any file is written.
+class AfterTheBackup : public testsupport::TakeOver<int(const char*, const char*)> {
+ public:
+  explicit AfterTheBackup(const std::function<void()>& action)
+      : TakeOver(testsupport::calls::rename, [action](const char* from, const char* to) {
+          const int result = testsupport::calls::rename.Real(from, to);
+          if (std::string(from).find("/.unfinished.") != std::string::npos) {
+            action();
+          }
+          return result;
+        }) {}
+};
+
 TEST_F(ChangeSetTest, WritesEveryFile) {
   PlanBoth();
   changes_.Apply();
@@ -148,6 +161,71 @@ TEST_F(ChangeSetTest, RefusesAFileThatSomebodyElseHasChanged) {
   EXPECT_TRUE(Backups().empty());
 }
 
+TEST_F(ChangeSetTest, RefusesAFileThatIsChangedWhileTheBackupIsWritten) {
+  PlanBoth();
+  const AfterTheBackup change([this] { WriteFile(folder_ + "second", "another's\n"); });
+  const Failure failure = FailureOf([&] { changes_.Apply(); });
+  EXPECT_EQ(failure.Code(), ExitCode::Conflict);
+  EXPECT_EQ(DetailOf(failure, "file"), folder_ + "second");
+  EXPECT_EQ(ReadFile(folder_ + "first"), "first\n");
+  EXPECT_EQ(ReadFile(folder_ + "second"), "another's\n");
+  EXPECT_TRUE(Backups().empty());
+}
+
+TEST_F(ChangeSetTest, FollowsNoLinkThatTakesTheFilesPlaceWhileTheBackupIsWritten) {
+  const testsupport::ScratchFolder outside;
+  WriteFile(outside.Path() + "first", "first\n");
+  PlanBoth();
+  const AfterTheBackup link([&] {
+    testsupport::RemoveFile(folder_ + "first");
+    ASSERT_EQ(symlink((outside.Path() + "first").c_str(), (folder_ + "first").c_str()), 0);
+  });
+  EXPECT_EQ(FailureOf([&] { changes_.Apply(); }).Code(), ExitCode::Conflict);
+  EXPECT_EQ(ReadFile(outside.Path() + "first"), "first\n");
+}
+
+TEST_F(ChangeSetTest, FollowsNoLinkThatTakesAFoldersPlaceWhileTheBackupIsWritten) {
+  const testsupport::ScratchFolder outside;
+  WriteFile(outside.Path() + "file", "file\n");
+  testsupport::MakeFolders(folder_ + "etc");
+  WriteFile(folder_ + "etc/file", "file\n");
+  changes_.Write(Read("/etc/file"), "changed\n");
+  const AfterTheBackup link([&] {
+    ASSERT_EQ(testsupport::calls::rename.Real((folder_ + "etc").c_str(), (folder_ + "old").c_str()), 0);
+    ASSERT_EQ(symlink(outside.Path().c_str(), (folder_ + "etc").c_str()), 0);
+  });
+  EXPECT_EQ(FailureOf([&] { changes_.Apply(); }).Code(), ExitCode::Conflict);
+  EXPECT_EQ(ReadFile(outside.Path() + "file"), "file\n");
+}
+
+TEST_F(ChangeSetTest, PutsNothingBackThroughALink) {
+  const testsupport::ScratchFolder outside;
+  WriteFile(outside.Path() + "file", "changed\n");
+  testsupport::MakeFolders(folder_ + "etc");
+  testsupport::MakeFolders(folder_ + outside.Path());
+  WriteFile(folder_ + "etc/file", "file\n");
+  WriteFile(folder_ + outside.Path() + "file", "changed\n");
+  changes_.Write(Read("/etc/file"), "changed\n");
+  changes_.Write(Read("/second"), "second, changed\n");
+  const RenameOnto second(folder_ + "second", [&](const char* from, const char* to) {
+    testsupport::calls::rename.Real((folder_ + "etc").c_str(), (folder_ + "old").c_str());
+    EXPECT_EQ(symlink(outside.Path().c_str(), (folder_ + "etc").c_str()), 0);
+    return FailToWrite(from, to);
+  });
+  const Failure failure = FailureOf([&] { changes_.Apply(); });
+  EXPECT_EQ(DetailOf(failure, "left"), folder_ + "etc/file: not put back");
+  EXPECT_EQ(ReadFile(outside.Path() + "file"), "changed\n");
+}
+
+TEST_F(ChangeSetTest, WritesBothNamesOfOneFile) {
+  testsupport::RemoveFile(folder_ + "second");
+  ASSERT_EQ(link((folder_ + "first").c_str(), (folder_ + "second").c_str()), 0);
+  PlanBoth();
+  changes_.Apply();
+  EXPECT_EQ(ReadFile(folder_ + "first"), "first, changed\n");
+  EXPECT_EQ(ReadFile(folder_ + "second"), "second, changed\n");
+}
+
 TEST_F(ChangeSetTest, RefusesToMakeAFileThatSomebodyElseHasMade) {
   changes_.Write(Read("/new"), "new\n");
   WriteFile(folder_ + "new", "another's\n");
@@ -206,7 +284,8 @@ TEST_F(ChangeSetTest, KeepsTheBackupWhenAFileCouldNotBePutBack) {
   const Failure failure = FailureOf([&] { changes_.Apply(); });
   EXPECT_EQ(DetailOf(failure, "left"), first + ": not put back");
   ASSERT_EQ(Backups().size(), 1U);
-  EXPECT_EQ(failure.Advice(), "velmorctl nss restore " + Backups().front());
+  EXPECT_EQ(failure.Advice(), "velmorctl nss restore " + Backups().front() + " --root " +
+                                  scratch_.Path().substr(0, scratch_.Path().size() - 1));
   EXPECT_EQ(ReadFile(first), "first, changed\n");
 }
 

@@ -6,6 +6,7 @@
 #include <random>
 
 #include "support/files.h"
+#include "text.h"
 #include "tool.h"
 
 namespace velmorctltest {
@@ -65,6 +66,11 @@ INSTANTIATE_TEST_SUITE_P(
 TEST(UnifiedDiffOfMissingFilesTest, NamesTheNullDevice) {
   EXPECT_EQ(UnifiedDiff("/file", std::nullopt, "a\n"), "--- /dev/null\n+++ b/file\n@@ -0,0 +1 @@\n+a\n");
   EXPECT_EQ(UnifiedDiff("/file", "a\n", std::nullopt), "--- a/file\n+++ /dev/null\n@@ -1 +0,0 @@\n-a\n");
+}
+
+TEST(UnifiedDiffOfOddNamesTest, ForgesNoLines) {
+  EXPECT_EQ(UnifiedDiff("/file\n+++ b/other", "a\n", std::nullopt),
+            "--- a/file?+++ b/other\n+++ /dev/null\n@@ -1 +0,0 @@\n-a\n");
 }
 
 /// A text of a few different lines, many of them equal, with or without a newline at its end.
@@ -132,6 +138,12 @@ TEST(PrintableLinesTest, HidesControlCharactersOfTheSecondSet) {
   EXPECT_EQ(velmorctl::PrintableLines("a\xc2\x9b"
                                       "31m"),
             "a^?31m");
+}
+
+TEST(PrintableTest, HidesControlCharactersOfBothSets) {
+  EXPECT_EQ(velmorctl::Printable("a\x1b\n\x7f\xc2\x80\xc2\x9f.\xc2\xa0\xc2"),
+            "a????"
+            "?.\xc2\xa0\xc2");
 }
 
 TEST(PrintableLinesTest, LeavesOtherLetters) {

@@ -21,6 +21,8 @@ class Actions {
   /// Whether the search ends at this service whatever its answer is.
   bool AlwaysReturn() const;
 
+  bool operator==(const Actions&) const = default;
+
  private:
   std::array<LookupAction, 4> actions_ = {LookupAction::Return, LookupAction::Continue,
                                           LookupAction::Continue, LookupAction::Continue};

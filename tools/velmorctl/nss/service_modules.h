@@ -14,6 +14,8 @@ class ServiceModules {
  public:
   explicit ServiceModules(const RootFolder& root);
 
+  const RootFolder& Root() const { return root_; }
+
   /// Whether the root has library folders at all; a tree of settings alone has none.
   bool CanTell() const { return !folders_.empty(); }
 

@@ -88,7 +88,7 @@ class Check {
       if (modules_.CanTell() && !modules_.Has(name) && !IsMissingByDefault(line.database, name)) {
         Add(line, name, "the library folders have no module libnss_" + name + ".so.2",
             "install the package that brings it, or take the service out: velmorctl nss remove " +
-                line.database + " " + name);
+                line.database + " " + name + modules_.Root().Option());
       }
     }
   }

@@ -99,6 +99,20 @@ std::size_t PlaceOf(const ServiceMeaning& service, const std::string& after, con
   return goesFirst ? 0 : line.services.size();
 }
 
+/// Refuses a directory's service that is asked before the local files could answer for root.
+void RequireBehindLocal(const std::string& shown, const SwitchLine& line, std::size_t place) {
+  const auto local =
+      std::find_if(line.services.begin(), line.services.end(),
+                   [](const SwitchService& service) { return IsLocalService(service.meaning.name); });
+  if (local - line.services.begin() < static_cast<std::ptrdiff_t>(place) || local == line.services.end()) {
+    return;
+  }
+  const std::string& name = local->meaning.name;
+  throw Refusal(shown, line, "the service would be asked before \"" + name + "\"",
+                "local accounts would depend on it")
+      .Try("put it behind the local files, with --after " + name + " or without --after");
+}
+
 void RequireLocalStaysFirst(const std::string& shown, const SwitchLine& line, const Meaning& wanted) {
   const bool wasFirst = IsLocalFirst(line.database, line.Meaning());
   const bool hadLocal = HoldsLocalAccounts(line.database) && HasLocal(line.Meaning());
@@ -115,6 +129,20 @@ void RequireServicesLeft(const std::string& shown, const SwitchLine& line, const
     throw Refusal(shown, line, "\"" + line.database + "\" would have no services left",
                   "programs that look something up in such a database may crash")
         .Try("add another service first, or remove the whole line by hand");
+  }
+}
+
+/// Refuses a service that is there with brackets that mean something else than those it needs.
+void RequireCriterion(const std::string& shown, const SwitchLine& line, const SwitchService& present,
+                      const ServiceMeaning& needed) {
+  const std::string criterion = Join(needed.criterion, " ");
+  if (!needed.criterion.empty() && ParseCriterion(criterion) != present.actions) {
+    throw Failure(ExitCode::Configuration, "\"" + line.database + "\" has the service \"" + needed.name +
+                                               "\", but not as the provider needs it")
+        .Detail("file", shown)
+        .Detail("line", std::to_string(line.number))
+        .Detail("reason", "the provider needs [" + criterion + "] behind it")
+        .Try("write these brackets behind the service, in place of any that stand there");
   }
 }
 
@@ -162,10 +190,17 @@ SwitchEdit AddToLine(const SwitchFile& file, const std::string& shown, const Swi
     wanted.insert(wanted.begin() + static_cast<std::ptrdiff_t>(place), service);
   }
   RequireLocalStaysFirst(shown, line, wanted);
+  if (HoldsLocalAccounts(line.database) && !IsLocalService(service.name)) {
+    RequireBehindLocal(shown, line, place);
+  }
   SwitchEdit edit = {InsertBefore(file, line, place, written), {}};
   ProveEdit(file, SwitchFile(edit.content), shown, {line.number, line.database, wanted});
   if (wanted.size() == line.services.size() + 1) {
     edit.warnings = WarningsFor(wanted, place, line);
+  }
+  if (HoldsLocalAccounts(line.database) && !HasLocal(wanted)) {
+    edit.warnings.push_back("\"" + line.database +
+                            "\" has neither \"files\" nor \"compat\", so that no local account is found");
   }
   return edit;
 }
@@ -244,7 +279,8 @@ SwitchEdit AddService(const SwitchFile& file, const std::string& shown, const st
   if (line == nullptr) {
     return AddLine(file, shown, database, service, after);
   }
-  if (line->Find(service.name) != nullptr) {
+  if (const SwitchService* present = line->Find(service.name)) {
+    RequireCriterion(shown, *line, *present, service);
     return {file.Text(), {}};
   }
   return AddToLine(file, shown, *line, service, after);

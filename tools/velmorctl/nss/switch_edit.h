@@ -22,9 +22,10 @@ struct SwitchEdit {
 /// it reads the line without loss. `shown` names the file in messages.
 ///
 /// They throw Failure: Usage for a name that cannot be one, a service to stand behind that is not there,
-/// what would leave local accounts without their files, and what would leave a database of the C library
-/// without services; Configuration when the file has a fault that makes
-/// the change uncertain, or the proof fails.
+/// what would leave local accounts without their files or have another service asked before them, and what
+/// would leave a database of the C library without services; Configuration when the file has a fault that
+/// makes the change uncertain, when the service is there with brackets that mean something else than those it
+/// is to have, or when the proof fails.
 
 /// Puts the service behind the one called `after` and what stands in brackets behind that or, when `after` is
 /// empty, at the end. "files" and "compat" come first where local accounts depend on them. A database without

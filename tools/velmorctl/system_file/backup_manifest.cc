@@ -7,6 +7,9 @@
 #include <nlohmann/json.hpp>
 #include <stdexcept>
 
+#include "failure.h"
+#include "text.h"
+
 namespace velmorctl {
 
 namespace {
@@ -23,6 +26,17 @@ Json AsJson(const ListedFile& listed) {
           {"mode", listed.file.mode},   {"owner", listed.file.owner},
           {"group", listed.file.group}, {"copy", listed.copy},
           {"sha256", listed.sha256}};
+}
+
+/// The document is UTF-8, and another name would not be found again.
+void RequireText(const std::string& name) {
+  try {
+    static_cast<void>(Json(name).dump());
+  } catch (const Json::type_error&) {
+    throw Failure(ExitCode::Configuration, "no backup can be made of a file whose name is not UTF-8")
+        .Detail("file", Printable(name))
+        .Try("rename it");
+  }
 }
 
 /// The copies lie in the backup's folder, so their names are no paths.
@@ -72,10 +86,11 @@ std::string Sha256(std::string_view bytes) {
 std::string ManifestText(const BackupManifest& manifest) {
   Json files = Json::array();
   for (const ListedFile& listed : manifest.files) {
+    RequireText(listed.file.name);
     files.push_back(AsJson(listed));
   }
   const Json document = {{"schema", schema}, {"command", manifest.command}, {"files", files}};
-  return document.dump(2) + "\n";
+  return document.dump(2, ' ', false, Json::error_handler_t::replace) + "\n";
 }
 
 BackupManifest ParseManifest(const std::string& text) {

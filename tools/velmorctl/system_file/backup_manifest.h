@@ -25,6 +25,7 @@ struct BackupManifest {
   std::vector<ListedFile> files;
 };
 
+/// Throws Failure (Configuration) for a file whose name is not UTF-8.
 std::string ManifestText(const BackupManifest& manifest);
 
 /// Throws std::invalid_argument with the reason when the text is no such list.

@@ -42,7 +42,8 @@ class BackupStore {
   /// `kind` is "nss" or "pam".
   BackupStore(RootFolder root, std::string kind);
 
-  /// Writes a backup of the files, durably, and returns its ID. Throws Failure; nothing is left behind then.
+  /// Writes a backup of the files, durably, and returns its ID. Throws Failure, also
+  /// for a file whose name is not UTF-8; nothing is left behind then.
   std::string Write(const std::string& command, const std::vector<Snapshot>& files) const;
 
   /// The IDs, the newest first. Throws Failure when the folder cannot be read.

@@ -95,9 +95,9 @@ void ChangeSet::Watch(Situation& situation) const {
 std::string ChangeSet::Apply() const {
   const SignalHold hold;
   const EditLock lock(root_);
-  RequireUnchanged();
   std::vector<Snapshot> files;
   for (const Edit& edit : edits_) {
+    RequireUnchanged(edit);
     files.push_back(edit.before);
   }
   const BackupStore store(root_, kind_);
@@ -105,6 +105,8 @@ std::string ChangeSet::Apply() const {
   std::size_t performed = 0;
   try {
     for (const Edit& edit : edits_) {
+      // The backup has waited for the disk, long enough for others to change the file.
+      RequireUnchanged(edit);
       ++performed;
       Perform(edit);
       Prove(edit);
@@ -115,13 +117,11 @@ std::string ChangeSet::Apply() const {
   return backup;
 }
 
-void ChangeSet::RequireUnchanged() const {
-  for (const Edit& edit : edits_) {
-    if (!IsStillAsRead(root_, edit.before)) {
-      throw Failure(ExitCode::Conflict, "'" + edit.before.shown + "' was changed by somebody else meanwhile")
-          .Detail("file", edit.before.shown)
-          .Try("run the command again, which then starts from the file as it is now");
-    }
+void ChangeSet::RequireUnchanged(const Edit& edit) const {
+  if (!IsStillAsRead(root_, edit.before)) {
+    throw Failure(ExitCode::Conflict, "'" + edit.before.shown + "' was changed by somebody else meanwhile")
+        .Detail("file", edit.before.shown)
+        .Try("run the command again, which then starts from the file as it is now");
   }
 }
 
@@ -139,7 +139,8 @@ void ChangeSet::Perform(const Edit& edit) const {
 void ChangeSet::Prove(const Edit& edit) const {
   const Snapshot now = ReadSystemFileIfThere(root_, edit.before.name);
   const mode_t mode = edit.before.Exists() ? edit.before.identity->mode & 07777 : edit.whenNew.mode;
-  if (ContentBefore(now) != edit.after || (now.Exists() && (now.identity->mode & 07777) != mode)) {
+  if (now.path != edit.before.path || ContentBefore(now) != edit.after ||
+      (now.Exists() && (now.identity->mode & 07777) != mode)) {
     throw Failure(ExitCode::Configuration, "'" + edit.before.shown + "' is not what was written to it")
         .Detail("file", edit.before.shown)
         .Try("see whether another program writes the file, and whether the disk is sound");
@@ -147,10 +148,14 @@ void ChangeSet::Prove(const Edit& edit) const {
 }
 
 /// Whether the file is as before. One that holds neither what was there nor what was written belongs to
-/// somebody else, and stays.
+/// somebody else, and stays; so does one that the name does not lead to any more.
 bool ChangeSet::PutBack(const Edit& edit) const {
   try {
-    const std::optional<std::string> now = ContentBefore(ReadSystemFileIfThere(root_, edit.before.name));
+    const Snapshot snapshot = ReadSystemFileIfThere(root_, edit.before.name);
+    if (snapshot.path != edit.before.path) {
+      return false;
+    }
+    const std::optional<std::string> now = ContentBefore(snapshot);
     const std::optional<std::string> before = ContentBefore(edit.before);
     if (now == before) {
       return true;
@@ -186,7 +191,7 @@ void ChangeSet::UndoAndThrow(std::size_t performed, const BackupStore& store, co
     throw failure;
   }
   throw failure.Detail("left", Join(left, ", ") + ": not put back")
-      .Try("velmorctl " + kind_ + " restore " + backup);
+      .Try("velmorctl " + kind_ + " restore " + backup + root_.Option());
 }
 
 }  // namespace velmorctl

@@ -49,6 +49,11 @@ class ChangeSet {
   /// durably, and read again to prove that it is what was planned. Returns the ID of the backup. Signals
   /// that would end the command wait meanwhile; a wait for the disk is the longest that it takes.
   ///
+  /// Right before a file is replaced its name is resolved and the file read once more. What is left are the
+  /// moments until the new file takes its place: a change that a program makes in them without the editing
+  /// lock is lost, and whoever may write the folders of the root could put a link there that the writer
+  /// follows. So a root is to be one whose folders only trusted users may write.
+  ///
   /// Throws Failure, after it has put back what it had changed and removed the backup: Conflict when another
   /// command is at it, or a file is not as it was read; Configuration when a file cannot be written, or is
   /// not what was written. When a file could not be put back, or somebody else has changed it meanwhile, the
@@ -62,7 +67,7 @@ class ChangeSet {
     NewFileAttributes whenNew;
   };
 
-  void RequireUnchanged() const;
+  void RequireUnchanged(const Edit& edit) const;
   void Perform(const Edit& edit) const;
   void Prove(const Edit& edit) const;
   bool PutBack(const Edit& edit) const;

@@ -3,7 +3,9 @@
 #include <iostream>
 
 #include "command.h"
+#include "failure.h"
 #include "system_file/unified_diff.h"
+#include "text.h"
 
 namespace velmorctl {
 
@@ -24,10 +26,14 @@ ExitCode ShowAndApply(const ChangeSet& changes, const RootFolder& root, bool dry
     std::cout << "Nothing was written.\n";
     return ExitCode::Fine;
   }
+  // What the administrator could not see is not done.
+  if (!std::cout.flush()) {
+    throw Failure(ExitCode::Other, "cannot write the output").Try("check where standard output goes");
+  }
   changes.Watch(situation);
   const std::string backup = changes.Apply();
   std::cout << "Done. To undo it: velmorctl " << changes.Kind() << " restore " << backup
-            << (root.IsHost() ? "" : " --root " + root.Shown("")) << "\n";
+            << Printable(root.Option()) << "\n";
   return ExitCode::Fine;
 }
 

@@ -16,7 +16,7 @@ void AddDryRunFlag(CLI::App& command, bool& dryRun);
 
 /// Prints the planned changes as a unified diff and, unless `dryRun`, makes them and tells how to undo them.
 /// Says so when there is nothing to change. Throws Failure: NeedsRoot when the running system is to be
-/// changed by another user, and what ChangeSet::Apply() throws.
+/// changed by another user, Other when the changes could not be printed, and what ChangeSet::Apply() throws.
 ExitCode ShowAndApply(const ChangeSet& changes, const RootFolder& root, bool dryRun, Situation& situation);
 
 /// Prints the planned changes as a unified diff and changes nothing: Difference, or Fine when there are none.

@@ -12,14 +12,25 @@ namespace velmorctl {
 
 namespace {
 
-std::string NewestOf(const BackupStore& store, const std::string& kind) {
+/// How the command of a backup begins that a restore has left.
+std::string RestoreOf(const std::string& kind) {
+  return kind + " restore ";
+}
+
+/// The backup of a restore is not meant unless it is named: else a second restore would bring the change
+/// back.
+Backup NewestOf(const BackupStore& store, const std::string& kind) {
   const std::vector<std::string> ids = store.Ids();
-  if (ids.empty()) {
-    throw Failure(ExitCode::Configuration, "there is no backup to restore")
-        .Detail("folder", std::string(backupFolder) + "/" + kind)
-        .Try("every change that velmorctl makes leaves a backup; none was made yet");
+  for (const std::string& id : ids) {
+    Backup backup = store.Read(id);
+    if (!backup.command.starts_with(RestoreOf(kind))) {
+      return backup;
+    }
   }
-  return ids.front();
+  throw Failure(ExitCode::Configuration, "there is no backup to restore")
+      .Detail("folder", std::string(backupFolder) + "/" + kind)
+      .Try(ids.empty() ? "every change that velmorctl makes leaves a backup; none was made yet"
+                       : "give the ID of one that a restore has left: " + Join(ids, ", "));
 }
 
 std::vector<std::string> NamesOf(const Backup& backup) {
@@ -43,8 +54,8 @@ Backup ReadForListing(const BackupStore& store, const std::string& id) {
 
 ChangeSet PlanRestore(const RootFolder& root, const std::string& kind, const std::string& id) {
   const BackupStore store(root, kind);
-  const Backup backup = store.Read(id.empty() ? NewestOf(store, kind) : id);
-  ChangeSet changes(root, kind, kind + " restore " + backup.id);
+  const Backup backup = id.empty() ? NewestOf(store, kind) : store.Read(id);
+  ChangeSet changes(root, kind, RestoreOf(kind) + backup.id);
   for (const BackedUpFile& file : backup.files) {
     Snapshot now = ReadSystemFileIfThere(root, file.name);
     if (file.existed) {

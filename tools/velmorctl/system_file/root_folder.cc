@@ -57,6 +57,10 @@ std::string RootFolder::Shown(const std::string& name) const {
   return IsHost() ? name : folder_ + name;
 }
 
+std::string RootFolder::Option() const {
+  return IsHost() ? "" : " --root " + folder_;
+}
+
 std::string RootFolder::Resolve(const std::string& name) const {
   std::deque<std::string> parts;
   PutInFront(name, parts);

@@ -31,6 +31,9 @@ class RootFolder {
   /// durably, and returns its path on the running system. Throws Failure (Configuration).
   std::string MakeFolder(const std::string& name, mode_t mode) const;
 
+  /// What follows a command that messages show, so that it works on this root: nothing for the host's own.
+  std::string Option() const;
+
   /// `name` as messages show it: with the root in front, unless that is the host's own.
   std::string Shown(const std::string& name) const;
 

@@ -142,6 +142,14 @@ std::optional<FileProblem> Read(Snapshot& snapshot) {
   return ProblemOf(snapshot, Kind::Unreadable, "it is changed while it is read", "run the command again");
 }
 
+/// Whether it is the same file with the same owner and mode. The time of its last change of status does not
+/// count: the replacement of another name of a file with several hard links changes that.
+bool SameFile(const FileIdentity& left, const FileIdentity& right) {
+  return left.device == right.device && left.inode == right.inode &&
+         SameTime(left.modified, right.modified) && left.mode == right.mode && left.owner == right.owner &&
+         left.group == right.group;
+}
+
 }  // namespace
 
 FileIdentity FileIdentity::Of(const struct stat& status) {
@@ -192,8 +200,8 @@ bool IsStillAsRead(const RootFolder& root, const Snapshot& snapshot) {
   if (!snapshot.Exists()) {
     return now.problem && now.problem->kind == Kind::Missing && now.snapshot.path == snapshot.path;
   }
-  return !now.problem && now.snapshot.path == snapshot.path && now.snapshot.identity == snapshot.identity &&
-         now.snapshot.content == snapshot.content;
+  return !now.problem && now.snapshot.path == snapshot.path &&
+         SameFile(*now.snapshot.identity, *snapshot.identity) && now.snapshot.content == snapshot.content;
 }
 
 }  // namespace velmorctl

@@ -58,7 +58,8 @@ Snapshot ReadSystemFile(const RootFolder& root, const std::string& name);
 /// The same for a file that may be missing: the snapshot then says so.
 Snapshot ReadSystemFileIfThere(const RootFolder& root, const std::string& name);
 
-/// Whether the file is as it was when the snapshot was taken: same file, same times, same bytes; or still
+/// Whether the file is as it was when the snapshot was taken: its name leads to the same path and the same
+/// file, with the same time of its last change, owner, mode and bytes; or to the same path, where it is still
 /// missing.
 bool IsStillAsRead(const RootFolder& root, const Snapshot& snapshot);
 

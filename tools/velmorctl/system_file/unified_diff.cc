@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "system_file/line_difference.h"
+#include "text.h"
 
 namespace velmorctl {
 
@@ -76,8 +77,10 @@ std::string UnifiedDiff(const std::string& name, const std::optional<std::string
   if (before == after) {
     return {};
   }
+  // A newline in the name would forge lines.
+  const std::string shown = Printable(name);
   std::string text =
-      "--- " + (before ? "a" + name : "/dev/null") + "\n+++ " + (after ? "b" + name : "/dev/null") + "\n";
+      "--- " + (before ? "a" + shown : "/dev/null") + "\n+++ " + (after ? "b" + shown : "/dev/null") + "\n";
   for (const Hunk& hunk : Hunks(LineDifference(oldLines, newLines))) {
     AppendHunk(hunk, oldLines, newLines, text);
   }
@@ -86,19 +89,18 @@ std::string UnifiedDiff(const std::string& name, const std::optional<std::string
 
 std::string PrintableLines(const std::string& text) {
   std::string printable;
-  for (std::size_t index = 0; index < text.size(); ++index) {
-    const auto byte = static_cast<unsigned char>(text[index]);
-    const auto next = index + 1 < text.size() ? static_cast<unsigned char>(text[index + 1]) : 0;
-    if (byte == 0xc2 && next >= 0x80 && next <= 0x9f) {
-      // A control character of the second set, in UTF-8.
+  for (std::size_t index = 0; index < text.size();) {
+    const std::size_t size = ControlCharacterAt(text, index);
+    const char character = text[index];
+    if (size == 2) {
       printable += "^?";
-      ++index;
-    } else if ((byte < 0x20 && byte != '\n' && byte != '\t') || byte == 0x7f) {
+    } else if (size == 1 && character != '\n' && character != '\t') {
       printable += '^';
-      printable += static_cast<char>(byte ^ 0x40U);
+      printable += static_cast<char>(static_cast<unsigned char>(character) ^ 0x40U);
     } else {
-      printable += text[index];
+      printable += character;
     }
+    index += size > 0 ? size : 1;
   }
   return printable;
 }
