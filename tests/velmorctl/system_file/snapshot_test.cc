@@ -157,7 +157,7 @@ TEST_F(SnapshotTest, NoticesAnotherFileWithTheSameContent) {
 TEST_F(SnapshotTest, NoticesAnotherMode) {
   WriteFile(path_, "text\n");
   const Snapshot snapshot = Read();
-  testsupport::SetMode(path_, 0600);
+  testsupport::SetMode(path_, 0604);
   EXPECT_FALSE(IsStillAsRead(root_, snapshot));
 }
 
