@@ -192,6 +192,10 @@ TEST_P(PamShapeTest, UsersOfTheDirectoryGetInAndLocalOnesToo) {
   EXPECT_TRUE(LetsIn("local", "down", {DIRECTORY_MODULE + "=module_unknown"}));
   EXPECT_FALSE(LetsIn("local", "up", {"auth:pam_unix=auth_err"}));
   EXPECT_FALSE(LetsIn("local", "up", {"account:pam_unix=acct_expired"}));
+  // The directory has an account of this name, too.
+  const std::string yes = DirectoryAnswers("auth", "success");
+  EXPECT_FALSE(LetsIn("local", "up", {"auth:pam_unix=auth_err", yes}));
+  EXPECT_FALSE(LetsIn("root", "up", {"auth:pam_unix=auth_err", yes}));
 }
 
 TEST_P(PamShapeTest, DisablingGivesBackEveryByte) {
@@ -240,6 +244,8 @@ TEST_F(PamHandKeptTest, BehindASufficientLineStandsAnotherOne) {
   ASSERT_EQ(root_.Pam({"enable"}).exitCode, 0);
   EXPECT_TRUE(Has("system-auth",
                   "pam_unix.so try_first_pass nullok\n"
+                  "# Added by \"velmorctl pam enable\": pam_localuser.so\n"
+                  "auth\t[success=1 default=ignore]\tpam_localuser.so\n"
                   "# Added by \"velmorctl pam enable\": pam_ctlscript first second try_first_pass\n"
                   "auth\tsufficient\tpam_ctlscript first second try_first_pass\n"));
   EXPECT_TRUE(
@@ -250,7 +256,7 @@ TEST_F(PamHandKeptTest, BehindASufficientLineStandsAnotherOne) {
 TEST_F(PamHandKeptTest, JumpsAreCorrectedThatPassOverTheNewLine) {
   WriteShape(root_, ARCH);
   ASSERT_EQ(root_.Pam({"enable"}).exitCode, 0);
-  EXPECT_TRUE(Has("system-auth", "-auth      [success=3 default=ignore]  pam_systemd_home.so\n"));
+  EXPECT_TRUE(Has("system-auth", "-auth      [success=4 default=ignore]  pam_systemd_home.so\n"));
   EXPECT_TRUE(Has("system-auth",
                   "auth\t[success=2 default=ignore]\tpam_ctlscript first second try_first_pass\n"
                   "auth       [success=1 default=bad]     pam_unix.so"));

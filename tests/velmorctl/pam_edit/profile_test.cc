@@ -62,7 +62,8 @@ TEST_F(PamProfileTest, DiffShowsTheChangeAndWritesNothing) {
   EXPECT_EQ(outcome.exitCode, DIFFERENCE) << outcome.errors;
   EXPECT_PRED2(Contains, outcome.output,
                "-auth\t[success=1 default=ignore]\tpam_unix.so nullok\n"
-               "+auth\t[success=2 default=ignore]\tpam_unix.so nullok\n"
+               "+auth\t[success=3 default=ignore]\tpam_unix.so nullok\n"
+               "+auth\t[success=1 default=ignore]\tpam_localuser.so\n"
                "+auth\t[success=1 default=ignore]\tpam_ctlscript first second try_first_pass\n");
   EXPECT_EQ(root_.Files(), before);
   EXPECT_FALSE(testsupport::Exists(root_.Path() + "/var/lib/quenix"));
@@ -196,6 +197,18 @@ TEST_F(PamProfileTest, EveryLoginServiceLetsUsersOfTheDirectoryIn) {
     EXPECT_FALSE(root_.LetsIn(service, "dora", "up", {DirectoryAnswers("account", "acct_expired")}))
         << service;
     EXPECT_FALSE(root_.LetsIn(service, "dora", "up", {DirectoryAnswers("auth", "auth_err")})) << service;
+  }
+}
+
+TEST_F(PamProfileTest, ThePasswordOfAnAccountOfTheDirectoryOpensNoLocalOneOfThatName) {
+  ASSERT_EQ(root_.Pam({"enable"}).exitCode, 0);
+  for (const std::string& service : LOGIN_SERVICES) {
+    for (const std::string user : {"local", "root"}) {
+      EXPECT_FALSE(root_.LetsIn(
+          service, user, "up",
+          {"auth:pam_unix=auth_err", "auth:pam_rootok=auth_err", DirectoryAnswers("auth", "success")}))
+          << service << ", " << user;
+    }
   }
 }
 

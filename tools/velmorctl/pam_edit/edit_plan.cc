@@ -186,8 +186,11 @@ class EnablePlanner {
     }
     for (const EditSpot& spot : spots) {
       std::string content = next.RequiredContent(spot.file);
+      std::size_t anchor = spot.line;
       for (const OwnLine& line : spot.lines) {
-        content = WithOwnLine(content, spot.line, line);
+        content = WithOwnLine(content, anchor, line);
+        // Another one goes before this one, which stands below its comment.
+        anchor += line.side == OwnLine::Side::Before ? 1 : 0;
       }
       next.Write(spot.file, content);
     }

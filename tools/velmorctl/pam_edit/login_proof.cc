@@ -84,6 +84,9 @@ std::vector<Trial> LocalTrials(const Policy& policy, const std::string& module) 
     trials.push_back({who + " whose account has expired",
                       circumstances,
                       {Given(localModule, Code::AccountExpired, Facility::Account)}});
+    trials.push_back({who + ", though the directory has an account of the same name",
+                      circumstances,
+                      {Given(module, Code::Success, Facility::Auth)}});
     circumstances.directoryUp = false;
     for (Code failure : failures) {
       trials.push_back({who + ", while the directory's module answers " + NameOf(failure),

@@ -3,6 +3,7 @@
 #include <optional>
 #include <sstream>
 
+#include "pam_edit/local_guard.h"
 #include "systemconfiguration/systemconfiguration.h"
 
 namespace velmorctl::pam {
@@ -33,7 +34,9 @@ std::optional<PAMPolicy> Read(const std::string& content) {
 bool IsOwn(const PAMEntry& entry, const OwnModules& own) {
   bool primer = entry.module() == "pam_permit.so" &&
                 entry.control() == SystemConfiguration::PAMControl::Required && entry.parameters().empty();
-  return primer || own.contains(entry.module());
+  bool guard = entry.module() == guardModule && entry.control() == std::string(guardControl) &&
+               entry.parameters().empty();
+  return primer || guard || own.contains(entry.module());
 }
 
 bool StacksAgree(const PAMStack& without, const PAMStack& with, const OwnModules& own) {

@@ -134,7 +134,9 @@ std::string WithOwnLine(const std::string& content, std::size_t anchor, const Ow
   std::string entry = std::string(NameOf(line.facility)) + "\t" + line.control + "\t" + line.module;
   std::vector<std::string>& lines = file.Lines();
   if (before) {
-    lines[beside.firstLine - 1].insert(0, comment + entry + "\n");
+    std::size_t at = beside.firstLine;
+    bool ownedAbove = at > 1 && OwnedBelow(file, at - 1);
+    lines[ownedAbove ? at - 2 : at - 1].insert(0, comment + entry + "\n");
   } else if (file.Text().FileLine(beside.lastLine).ends_with('\n')) {
     lines[beside.lastLine - 1] += comment + entry + "\n";
   } else {

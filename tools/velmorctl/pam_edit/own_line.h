@@ -22,8 +22,8 @@ struct OwnLine {
 
 /// Puts the line in beside the policy line that begins at line `anchor` of the file, with a comment above it
 /// that tells whose it is. Jumps of the same facility that lead past the new line are made one longer; one
-/// that leads to its place now leads to it. All other bytes stay. Throws std::invalid_argument when no policy
-/// line begins there.
+/// that leads to its place now leads to it. All other bytes stay. Before another own line it goes above that
+/// one's comment. Throws std::invalid_argument when no policy line begins there.
 std::string WithOwnLine(const std::string& content, std::size_t anchor, const OwnLine& line);
 
 /// The content as it was before the own lines were put in: with their comments, and with the jumps made

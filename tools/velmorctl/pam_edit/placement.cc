@@ -1,7 +1,9 @@
 #include "pam_edit/placement.h"
 
 #include <algorithm>
+#include <utility>
 
+#include "pam_edit/local_guard.h"
 #include "pam_edit/module_line.h"
 
 namespace velmorctl::pam {
@@ -36,6 +38,15 @@ std::string PasswordModule(const StackEntry& local, Facility facility, const Dir
   return takesNewOne ? text + " use_authtok" : text;
 }
 
+/// The last of the lines is the module's. It comes to stand behind the guard, whichever side they are on.
+Placement Guarded(std::vector<OwnLine> lines) {
+  const OwnLine& module = lines.back();
+  if (module.facility == Facility::Auth) {
+    lines.push_back({module.facility, module.side, guardControl, guardModule});
+  }
+  return {std::move(lines), ""};
+}
+
 /// Auth and password: who is let in by one of the two modules need not be known to the other. What success of
 /// the local module leads to, success of the directory's leads to as well.
 Placement PlaceAlternative(const StackEntry& local, Facility facility, const DirectoryModule& module) {
@@ -43,17 +54,17 @@ Placement PlaceAlternative(const StackEntry& local, Facility facility, const Dir
   Side side = GoesOnAfterRefusal(local) ? Side::After : Side::Before;
   Action success = ActionFor(local.actions, ReturnCode::Success);
   if (success.kind == Kind::Done) {
-    return {{{facility, side, "sufficient", text}}, ""};
+    return Guarded({{facility, side, "sufficient", text}});
   }
   if (success.kind == Kind::Jump) {
     // In front, it also has the local module itself to pass over.
     std::int32_t count = side == Side::After ? success.jump : success.jump + 1;
-    return {{{facility, side, JumpOver(count), text}}, ""};
+    return Guarded({{facility, side, JumpOver(count), text}});
   }
   if (success.kind == Kind::Ok && side == Side::Before) {
     // The stack's yes came from the module that is passed over.
-    return {{{facility, Side::After, "required", primerModule}, {facility, Side::Before, JumpOver(1), text}},
-            ""};
+    return Guarded(
+        {{facility, Side::After, "required", primerModule}, {facility, Side::Before, JumpOver(1), text}});
   }
   return {{}, "the control " + local.control + " of " + local.module + " leaves no place beside it"};
 }

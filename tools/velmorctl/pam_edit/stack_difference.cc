@@ -4,6 +4,7 @@
 #include <vector>
 
 #include "pam_edit/jumps.h"
+#include "pam_edit/local_guard.h"
 #include "text.h"
 
 namespace velmorctl::pam {
@@ -57,7 +58,8 @@ bool IsOwnEntry(const StackEntry& entry, const OwnModules& own) {
     return false;
   }
   bool primer = entry.module == "pam_permit.so" && entry.control == "required" && entry.arguments.empty();
-  return primer || own.contains(entry.module);
+  bool guard = entry.module == guardModule && entry.control == guardControl && entry.arguments.empty();
+  return primer || guard || own.contains(entry.module);
 }
 
 std::string UnexpectedDifference(const Stack& without, const Stack& with, const OwnModules& own) {
