@@ -63,7 +63,7 @@ TEST_F(PamProfileTest, DiffShowsTheChangeAndWritesNothing) {
   EXPECT_PRED2(Contains, outcome.output,
                "-auth\t[success=1 default=ignore]\tpam_unix.so nullok\n"
                "+auth\t[success=3 default=ignore]\tpam_unix.so nullok\n"
-               "+auth\t[success=1 default=ignore]\tpam_localuser.so\n"
+               "+auth\t[success=1 default=ignore]\tpam_localuser.so \n"
                "+auth\t[success=1 default=ignore]\tpam_ctlscript first second try_first_pass\n");
   EXPECT_EQ(root_.Files(), before);
   EXPECT_FALSE(testsupport::Exists(root_.Path() + "/var/lib/quenix"));
@@ -325,7 +325,7 @@ TEST_F(PamProfileTest, AToolThatDoesMoreThanItShouldIsRefused) {
   EXPECT_EQ(outcome.exitCode, NOT_READY);
   EXPECT_PRED2(
       Contains, outcome.errors,
-      "the service 'sshd' stays as it is: this entry would be another one: /etc/pam.d/common-auth, line 20");
+      "the service 'sshd' stays as it is: this entry would be another one: /etc/pam.d/common-auth, line 21");
   EXPECT_EQ(root_.Files().at(COMMON_AUTH), before.at(COMMON_AUTH));
   EXPECT_FALSE(testsupport::Exists(root_.Path() + PROFILE));
 }
