@@ -312,6 +312,17 @@ TEST_F(ProviderWithParametersTest, HasADifferenceWithoutThem) {
            "  line:     1\n  reason:   the provider needs [UNAVAIL=continue TRYAGAIN=return]");
 }
 
+TEST_F(ProviderWithParametersTest, HasADifferenceBesideADatabaseThatIsRefused) {
+  Install("parameters");
+  WriteFile(SWITCH_FILE, "passwd: files some\ngroup: files\n");
+  const Outcome outcome = Velmorctl({"nss", "diff"});
+  EXPECT_EQ(outcome.exitCode, 13);
+  ExpectIn(outcome.output, "+group: files some [UNAVAIL=continue TRYAGAIN=return]\n");
+  ExpectIn(outcome.errors, "warning: \"passwd\" stays as it is: ");
+  ExpectIn(outcome.errors,
+           "line: 1; reason: the provider needs [UNAVAIL=continue TRYAGAIN=return] behind it");
+}
+
 TEST_F(ProviderWithParametersTest, HasThemNotBehindAnotherService) {
   Install("parameters");
   Velmorctl({"nss", "add", "passwd", "winbind"});

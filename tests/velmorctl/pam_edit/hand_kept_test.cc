@@ -311,6 +311,22 @@ TEST_F(PamHandKeptTest, AServiceWithoutAPlaceStaysAndTheOthersChange) {
   EXPECT_TRUE(Has("ppp", "pam_ctlscript"));
 }
 
+TEST_F(PamHandKeptTest, ADifferenceIsToldBesideAServiceThatIsRefused) {
+  WriteShape(root_, PLAIN);
+  root_.Write("/etc/pam.d/odd", "auth optional pam_unix.so\naccount required pam_unix.so\n");
+  const Outcome outcome = root_.Pam({"diff", "--enable"});
+  EXPECT_EQ(outcome.exitCode, DIFFERENCE);
+  EXPECT_PRED2(Contains, outcome.errors, "the service 'odd' stays as it is");
+  EXPECT_PRED2(Contains, outcome.output, "+++ b/etc/pam.d/ppp");
+}
+
+TEST_F(PamHandKeptTest, ARefusalIsToldWhereNothingDiffers) {
+  root_.Write("/etc/pam.d/odd", "auth optional pam_unix.so\naccount required pam_unix.so\n");
+  const Outcome outcome = root_.Pam({"diff", "--enable"});
+  EXPECT_EQ(outcome.exitCode, NOT_READY);
+  EXPECT_PRED2(Contains, outcome.errors, "the service 'odd' stays as it is");
+}
+
 TEST_F(PamHandKeptTest, AServiceThatCannotBeProvedKeepsWhatItShares) {
   root_.Write("/etc/pam.d/shared", "auth sufficient pam_unix.so\nauth required pam_deny.so\n");
   // The jump of this one counts the lines of the file that it passes over.

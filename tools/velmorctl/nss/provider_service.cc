@@ -1,5 +1,7 @@
 #include "nss/provider_service.h"
 
+#include <optional>
+
 #include "active_provider.h"
 #include "failure.h"
 #include "nss/criterion.h"
@@ -15,6 +17,14 @@ Failure BadPlugin(const PluginDescription& plugin, const std::string& happened, 
       .Detail("file", plugin.file)
       .Detail("value", Printable(value))
       .Try("install the package that brings this plug-in again");
+}
+
+std::string AsWarning(const std::string& database, const Failure& refusal) {
+  std::string warning = "\"" + database + "\" stays as it is: " + refusal.what();
+  for (const Failure::NamedDetail& detail : refusal.Details()) {
+    warning += "; " + detail.name + ": " + detail.value;
+  }
+  return warning + "; try: " + refusal.Advice();
 }
 
 }  // namespace
@@ -49,14 +59,25 @@ ServiceMeaning ServiceCalled(const std::string& name, const RootFolder& root) {
 SwitchEdit AddToAccountDatabases(const SwitchFile& file, const std::string& shown,
                                  const ServiceMeaning& service) {
   SwitchEdit edit = {file.Text(), {}};
+  std::optional<Failure> refusal;
   for (const char* database : {"passwd", "group", "initgroups"}) {
     const SwitchFile now(edit.content);
     if (database == std::string("initgroups") && now.LinesOf(database).empty()) {
       continue;
     }
-    SwitchEdit next = AddService(now, shown, database, service, "");
-    edit.content = std::move(next.content);
-    edit.warnings.insert(edit.warnings.end(), next.warnings.begin(), next.warnings.end());
+    try {
+      SwitchEdit next = AddService(now, shown, database, service, "");
+      edit.content = std::move(next.content);
+      edit.warnings.insert(edit.warnings.end(), next.warnings.begin(), next.warnings.end());
+    } catch (const Failure& failure) {
+      edit.warnings.push_back(AsWarning(database, failure));
+      if (!refusal) {
+        refusal = failure;
+      }
+    }
+  }
+  if (refusal && edit.content == file.Text()) {
+    throw *refusal;
   }
   return edit;
 }

@@ -19,8 +19,9 @@ ServiceMeaning ProviderService(const RootFolder& root);
 ServiceMeaning ServiceCalled(const std::string& name, const RootFolder& root);
 
 /// Puts the service into the databases in which a directory's accounts are looked up: passwd and group, and
-/// initgroups when that has a line, since group is then not asked for the groups of a user. Throws what
-/// AddService() throws.
+/// initgroups when that has a line, since group is then not asked for the groups of a user. A database that
+/// AddService() refuses stays as it is, with a warning that says why; its failure is thrown when nothing else
+/// changes either.
 SwitchEdit AddToAccountDatabases(const SwitchFile& file, const std::string& shown,
                                  const ServiceMeaning& service);
 

@@ -63,7 +63,8 @@ ExitCode Diff(const Options& options, Situation& situation) {
   const RootFolder root(options.root);
   EditPlan plan = PlanFor(options.enable, root);
   PrintRemarks(plan);
-  return WithRefusals(ShowDifference(ChangesOf(plan, root, "pam diff")), plan);
+  ExitCode code = ShowDifference(ChangesOf(plan, root, "pam diff"));
+  return code == ExitCode::Difference ? code : WithRefusals(code, plan);
 }
 
 ExitCode Change(bool enable, const Options& options, Situation& situation) {
