@@ -75,6 +75,24 @@ TEST(CheckTest, AServiceThatLetsNoLocalUserInIsFound) {
             std::string::npos);
 }
 
+TEST(CheckTest, AServiceWithoutAStackForSessionsNeedsNone) {
+  EXPECT_EQ(Reasons(Check({{"svc", "auth required pam_unix.so\n" + ACCOUNT},
+                           {"other", "session required pam_deny.so\n"}})),
+            "");
+}
+
+TEST(CheckTest, AServiceWithoutAStackForSessionsMayLetEverybodyIn) {
+  const std::string reasons = Reasons(Check(
+      {{"svc", "auth required pam_permit.so\n" + ACCOUNT}, {"other", "session required pam_deny.so\n"}}));
+  EXPECT_NE(reasons.find("a wrong password, or none, lets everybody in"), std::string::npos) << reasons;
+}
+
+TEST(CheckTest, AServiceThatRefusesEverySessionLetsNoLocalUserIn) {
+  const std::string reasons =
+      Reasons(Check({{"svc", "auth required pam_unix.so\n" + ACCOUNT + "session required pam_deny.so\n"}}));
+  EXPECT_NE(reasons.find("no local user can log in"), std::string::npos) << reasons;
+}
+
 TEST(CheckTest, AServiceThatKeepsRootOutIsNoFault) {
   EXPECT_EQ(
       Reasons(Check({{"svc", "auth required pam_succeed_if.so user != root\nauth required pam_unix.so\n" +

@@ -15,11 +15,14 @@ using velmorctl::pam::CommonDirectoryModules;
 using velmorctl::pam::Facility;
 using velmorctl::pam::FindPerson;
 using velmorctl::pam::LocalAdministrator;
+using velmorctl::pam::LoginCall;
+using velmorctl::pam::LoginExtent;
 using velmorctl::pam::LoginOutcome;
 using velmorctl::pam::NameOf;
 using velmorctl::pam::ReadAnswerOverride;
 using velmorctl::pam::ResolvePolicy;
 using velmorctl::pam::ReturnCode;
+using velmorctl::pam::SimulateEachCall;
 using velmorctl::pam::SimulateLogin;
 
 /// As pam-auth-update writes it for a host with a directory.
@@ -111,6 +114,53 @@ TEST_F(LoginTest, AnswersCanBeGivenForAStackAndAnOccurrence) {
 TEST_F(LoginTest, TheSessionCanRefuse) {
   EXPECT_EQ(Login(DEBIAN, {"session:pam_unix=session_err"}).calls.size(), 4U);
   EXPECT_FALSE(Login(DEBIAN, {"session:pam_unix=session_err"}).succeeds);
+}
+
+class LoginExtentTest : public LoginTest {
+ protected:
+  bool GetsIn(const std::string& session, LoginExtent extent) const {
+    const PolicySet files = {{"svc", "auth required pam_unix.so\naccount required pam_unix.so\n" + session},
+                             {"other", "session required pam_deny.so\n"}};
+    return SimulateLogin(ResolvePolicy("svc", ReaderOf(files)), circumstances, {}, extent).succeeds;
+  }
+};
+
+TEST_F(LoginExtentTest, TheSessionOfOtherCountsInAWholeLoginOnly) {
+  EXPECT_FALSE(GetsIn("", LoginExtent::Whole));
+  EXPECT_TRUE(GetsIn("", LoginExtent::OwnSession));
+}
+
+TEST_F(LoginExtentTest, TheServicesOwnSessionCountsUnlessAdmissionIsAsked) {
+  EXPECT_FALSE(GetsIn("session required pam_deny.so\n", LoginExtent::OwnSession));
+  EXPECT_TRUE(GetsIn("session required pam_deny.so\n", LoginExtent::Admission));
+}
+
+std::vector<std::string> Answers(const std::vector<LoginCall>& calls) {
+  std::vector<std::string> answers;
+  for (const LoginCall& call : calls) {
+    answers.push_back(std::string(NameOf(call.operation)) + " " + NameOf(call.verdict.code));
+  }
+  return answers;
+}
+
+TEST_F(LoginTest, EachCallIsMadeWhateverTheOthersComeTo) {
+  const PolicySet files = {{"svc",
+                            "auth required pam_deny.so\naccount required pam_unix.so\n"
+                            "password required pam_deny.so\nsession required pam_unix.so\n"}};
+  EXPECT_EQ(Answers(SimulateEachCall(ResolvePolicy("svc", ReaderOf(files)), circumstances, {})),
+            (std::vector<std::string>{"pam_authenticate auth_err", "pam_acct_mgmt success",
+                                      "pam_chauthtok authtok_err", "pam_open_session success",
+                                      "pam_close_session success", "pam_setcred cred_err"}));
+}
+
+TEST_F(LoginTest, CredentialsAreSetBehindAPasswordAndWithoutOne) {
+  const PolicySet files = {{"svc",
+                            "auth [success=1 default=ignore] pam_succeed_if.so uid >= 0\n"
+                            "auth requisite pam_deny.so\nauth required pam_permit.so\n"}};
+  EXPECT_EQ(Answers(SimulateEachCall(ResolvePolicy("svc", ReaderOf(files)), circumstances, {})),
+            (std::vector<std::string>{"pam_authenticate success", "pam_setcred success",
+                                      "pam_acct_mgmt perm_denied", "pam_chauthtok perm_denied",
+                                      "pam_open_session perm_denied", "pam_setcred cred_err"}));
 }
 
 TEST_F(LoginTest, AStackWithoutLinesRefuses) {

@@ -359,6 +359,54 @@ TEST_F(PamHandKeptTest, AServiceThatLetsNoUserOfTheDirectoryInAnywayStaysAsItIs)
   EXPECT_EQ(root_.Read("/etc/pam.d/localonly"), text);
 }
 
+const std::string DENYING_SESSIONS = "auth required pam_deny.so\nsession required pam_deny.so\n";
+
+TEST_F(PamHandKeptTest, AServiceWithoutAStackForSessionsIsProvedWithoutOne) {
+  WriteShape(root_, PLAIN);
+  root_.Write("/etc/pam.d/other", DENYING_SESSIONS);
+  const Outcome outcome = root_.Pam({"enable"});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.errors;
+  EXPECT_EQ(outcome.errors, "");
+  EXPECT_TRUE(Has("ppp", "pam_ctlscript"));
+}
+
+TEST_F(PamHandKeptTest, AServiceWithoutAStackForSessionsThatLetsNoUserOfTheDirectoryInStaysAsItIs) {
+  const std::string text =
+      "auth required pam_localuser.so\nauth required pam_unix.so\naccount required pam_unix.so\n";
+  root_.Write("/etc/pam.d/localonly", text);
+  root_.Write("/etc/pam.d/other", DENYING_SESSIONS);
+  const Outcome outcome = root_.Pam({"enable"});
+  EXPECT_EQ(outcome.exitCode, NOT_READY);
+  EXPECT_PRED2(Contains, outcome.errors, "a user of the directory would still not get in");
+  EXPECT_EQ(root_.Read("/etc/pam.d/localonly"), text);
+}
+
+TEST_F(PamHandKeptTest, AServiceThatLetsNobodyInStaysAsItIs) {
+  const std::string text =
+      "auth required pam_unix.so\naccount required pam_unix.so\nsession required pam_deny.so\n";
+  root_.Write("/etc/pam.d/closed", text);
+  WriteShape(root_, PLAIN);
+  const Outcome outcome = root_.Pam({"enable"});
+  EXPECT_EQ(outcome.exitCode, NOT_READY);
+  EXPECT_PRED2(Contains, outcome.errors,
+               "the service 'closed' stays as it is: it cannot be proved: no local user gets in as it is "
+               "(pam_open_session answers session_err: pam_deny (/etc/pam.d/closed:3) answered session_err)");
+  EXPECT_EQ(root_.Read("/etc/pam.d/closed"), text);
+  EXPECT_TRUE(Has("ppp", "pam_ctlscript"));
+}
+
+TEST_F(PamHandKeptTest, AServiceThatLetsNobodyInHoldsUpNoneThatSharesItsFiles) {
+  root_.Write("/etc/pam.d/shared", "auth required pam_unix.so\naccount required pam_unix.so\n");
+  root_.Write("/etc/pam.d/closed",
+              "auth requisite pam_deny.so\nauth include shared\naccount include shared\n");
+  const Outcome outcome = root_.Pam({"enable"});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.errors;
+  EXPECT_PRED2(Contains, outcome.errors,
+               "note: the service 'closed' shares changed files with others, but it cannot be proved: no "
+               "local user gets in as it is");
+  EXPECT_TRUE(Has("shared", "pam_ctlscript"));
+}
+
 TEST_F(PamHandKeptTest, EnablingAgainTakesNoLineOutOfAServiceThatIsRefused) {
   WriteShape(root_, PLAIN);
   ASSERT_EQ(root_.Pam({"enable"}).exitCode, 0);

@@ -10,10 +10,6 @@ namespace velmorctl::pam {
 
 namespace {
 
-bool HasOwn(const Policy& policy, Facility facility) {
-  return !policy.StackOf(facility).empty() && !policy.IsFromOther(facility);
-}
-
 class ServiceCheck {
  public:
   ServiceCheck(const std::string& service, const CheckedSystem& system)
@@ -24,7 +20,7 @@ class ServiceCheck {
       return std::move(findings_);
     }
     for (Facility facility : facilities) {
-      if (HasOwn(policy_, facility)) {
+      if (policy_.HasOwn(facility)) {
         CheckModules(policy_.StackOf(facility));
         CheckReach(facility);
       }
@@ -32,7 +28,7 @@ class ServiceCheck {
     if (IsLoginService(policy_, system_.directoryModules)) {
       CheckLocalLogin();
     }
-    if (HasOwn(policy_, Facility::Auth)) {
+    if (policy_.HasOwn(Facility::Auth)) {
       CheckWrongPassword();
     }
     return std::move(findings_);
@@ -84,7 +80,7 @@ class ServiceCheck {
     circumstances.directoryModules = system_.directoryModules;
     circumstances.moduleExists = system_.moduleExists;
     circumstances.fileExists = system_.fileExists;
-    return SimulateLogin(policy_, circumstances, {});
+    return SimulateLogin(policy_, circumstances, {}, LoginExtent::OwnSession);
   }
 
   void ReportLogin(const std::string& reason, const std::string& remedy) {
@@ -140,8 +136,8 @@ bool IsLoginService(const Policy& policy, const std::set<std::string>& directory
   bool asks = std::any_of(stack.begin(), stack.end(), [&directoryModules](const StackEntry& entry) {
     return entry.kind == StackEntry::Kind::Module && AsksForPassword(entry.module, directoryModules);
   });
-  return asks && policy.service != otherService && HasOwn(policy, Facility::Auth) &&
-         HasOwn(policy, Facility::Account);
+  return asks && policy.service != otherService && policy.HasOwn(Facility::Auth) &&
+         policy.HasOwn(Facility::Account);
 }
 
 std::vector<Finding> CheckService(const std::string& service, const CheckedSystem& system) {

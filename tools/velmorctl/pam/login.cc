@@ -69,30 +69,36 @@ class Login {
         const std::vector<AnswerOverride>& overrides)
       : policy_(policy), circumstances_(circumstances), overrides_(overrides) {}
 
-  LoginOutcome Run() {
+  LoginOutcome Run(LoginExtent extent) {
+    LoginOutcome outcome;
     if (policy_.state != Policy::State::Usable) {
-      outcome_.reason = Unusable();
-      return std::move(outcome_);
+      outcome.reason = WhyUnusable(policy_);
+      return outcome;
     }
-    outcome_.succeeds = Passes(Operation::Authenticate) && PassesAccount() &&
-                        Passes(Operation::SetCredentials) && Passes(Operation::OpenSession);
-    if (outcome_.succeeds) {
-      outcome_.reason = reasonForYes_;
+    outcome.succeeds = Passes(Operation::Authenticate) && PassesAccount() &&
+                       (extent == LoginExtent::Admission || PassesEntry(extent));
+    // Of a login that succeeds, what authenticated tells most.
+    outcome.reason = outcome.succeeds ? calls_.front().reason : calls_.back().reason;
+    outcome.calls = std::move(calls_);
+    return outcome;
+  }
+
+  std::vector<LoginCall> RunEach() {
+    if (Passes(Operation::Authenticate)) {
+      Call(Operation::SetCredentials);
     }
-    return std::move(outcome_);
+    Call(Operation::ManageAccount);
+    ChangesPassword();
+    if (Passes(Operation::OpenSession)) {
+      Call(Operation::CloseSession);
+    }
+    ChainOf(Facility::Auth).clear();
+    Call(Operation::SetCredentials);
+    return std::move(calls_);
   }
 
  private:
-  std::string Unusable() const {
-    std::string what = policy_.state == Policy::State::Fatal ? "libpam crashes or hangs"
-                                                             : "libpam refuses the service with abort";
-    if (policy_.findings.empty()) {
-      return what;
-    }
-    const Finding& last = policy_.findings.back();
-    return what + ": " + last.origin.file +
-           (last.origin.line > 0 ? ":" + std::to_string(last.origin.line) : "") + ": " + last.reason;
-  }
+  FrozenChain& ChainOf(Facility facility) { return chains_[static_cast<std::size_t>(facility)]; }
 
   ModuleAnswer Answer(const Stack& stack, std::size_t index, Operation operation) const {
     for (const AnswerOverride& override : overrides_) {
@@ -103,20 +109,18 @@ class Login {
     return AnswerOf(stack[index], operation, circumstances_);
   }
 
-  bool Passes(Operation operation) {
-    ReturnCode code = Call(operation);
-    if (code == ReturnCode::Success && operation == Operation::Authenticate) {
-      reasonForYes_ = outcome_.reason;
-    }
-    return code == ReturnCode::Success;
-  }
+  bool Passes(Operation operation) { return Call(operation) == ReturnCode::Success; }
+
+  bool ChangesPassword() { return Passes(Operation::PrepareTokenChange) && Passes(Operation::ChangeToken); }
 
   bool PassesAccount() {
     ReturnCode code = Call(Operation::ManageAccount);
-    if (code == ReturnCode::NewTokenRequired) {
-      return Passes(Operation::PrepareTokenChange) && Passes(Operation::ChangeToken);
-    }
-    return code == ReturnCode::Success;
+    return code == ReturnCode::NewTokenRequired ? ChangesPassword() : code == ReturnCode::Success;
+  }
+
+  bool PassesEntry(LoginExtent extent) {
+    bool opensSession = extent == LoginExtent::Whole || policy_.HasOwn(Facility::Session);
+    return Passes(Operation::SetCredentials) && (!opensSession || Passes(Operation::OpenSession));
   }
 
   ReturnCode Call(Operation operation) {
@@ -130,21 +134,20 @@ class Login {
       notes[index] = std::move(answer.note);
       return answer.code;
     };
-    call.verdict = Simulate(stack, operation, answers, chains_[static_cast<std::size_t>(facility)]);
+    call.verdict = Simulate(stack, operation, answers, ChainOf(facility));
     for (const Step& step : call.verdict.trace) {
       call.notes.push_back(notes[step.entry]);
     }
-    outcome_.reason = ReasonOf(call, stack);
-    outcome_.calls.push_back(std::move(call));
-    return outcome_.calls.back().verdict.code;
+    call.reason = ReasonOf(call, stack);
+    calls_.push_back(std::move(call));
+    return calls_.back().verdict.code;
   }
 
   const Policy& policy_;
   const Circumstances& circumstances_;
   const std::vector<AnswerOverride>& overrides_;
   std::array<FrozenChain, facilities.size()> chains_;
-  LoginOutcome outcome_;
-  std::string reasonForYes_;
+  std::vector<LoginCall> calls_;
 };
 
 }  // namespace
@@ -179,8 +182,24 @@ std::optional<AnswerOverride> ReadAnswerOverride(const std::string& text) {
 }
 
 LoginOutcome SimulateLogin(const Policy& policy, const Circumstances& circumstances,
-                           const std::vector<AnswerOverride>& overrides) {
-  return Login(policy, circumstances, overrides).Run();
+                           const std::vector<AnswerOverride>& overrides, LoginExtent extent) {
+  return Login(policy, circumstances, overrides).Run(extent);
+}
+
+std::vector<LoginCall> SimulateEachCall(const Policy& policy, const Circumstances& circumstances,
+                                        const std::vector<AnswerOverride>& overrides) {
+  return Login(policy, circumstances, overrides).RunEach();
+}
+
+std::string WhyUnusable(const Policy& policy) {
+  std::string what = policy.state == Policy::State::Fatal ? "libpam crashes or hangs"
+                                                          : "libpam refuses the service with abort";
+  if (policy.findings.empty()) {
+    return what;
+  }
+  const Finding& last = policy.findings.back();
+  return what + ": " + last.origin.file +
+         (last.origin.line > 0 ? ":" + std::to_string(last.origin.line) : "") + ": " + last.reason;
 }
 
 }  // namespace velmorctl::pam

@@ -69,6 +69,9 @@ struct Policy {
 
   const Stack& StackOf(Facility facility) const { return stacks[static_cast<std::size_t>(facility)]; }
   bool IsFromOther(Facility facility) const { return fromOther[static_cast<std::size_t>(facility)]; }
+
+  /// Whether the service itself has lines for the facility.
+  bool HasOwn(Facility facility) const { return !StackOf(facility).empty() && !IsFromOther(facility); }
 };
 
 }  // namespace velmorctl::pam
