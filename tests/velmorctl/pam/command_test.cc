@@ -155,6 +155,9 @@ struct BadFile {
   const char* name;
   void (*make)(const std::string& path);
   const char* reason;
+  const char* remedy;
+  nlohmann::json line = nullptr;
+  const char* value = "";
 };
 
 class BadFileTest : public PamCommandTest, public ::testing::WithParamInterface<BadFile> {};
@@ -165,36 +168,94 @@ TEST_P(BadFileTest, IsReportedAndNotFollowed) {
   EXPECT_EQ(shown.exitCode, 11);
   EXPECT_TRUE(Has(shown.errors, GetParam().reason)) << shown.errors;
   EXPECT_LT(shown.errors.size(), 2000U);
-  const Outcome checked = Pam({"check"});
+  const Outcome checked = Pam({"check", "--json"});
   EXPECT_EQ(checked.exitCode, 13) << checked.errors;
-  EXPECT_TRUE(Has(checked.output, POLICIES + "bad")) << checked.output;
-  EXPECT_TRUE(Has(checked.output, GetParam().reason)) << checked.output;
+  EXPECT_EQ(checked.Json()["findings"],
+            (nlohmann::json{{{"file", POLICIES + "bad"},
+                             {"line", GetParam().line},
+                             {"value", GetParam().value},
+                             {"reason", std::string("the file cannot be read: ") + GetParam().reason},
+                             {"remedy", GetParam().remedy}}}));
 }
+
+constexpr char BINARY_REMEDY[] = "put a text file there, or move it away and restore a backup";
 
 INSTANTIATE_TEST_SUITE_P(
     Each, BadFileTest,
-    ::testing::Values(BadFile{"Binary",
-                              [](const std::string& path) {
-                                testsupport::WriteFile(path, std::string("\x7f"
-                                                                         "ELF\x02\x01\0",
-                                                                         7));
-                              },
-                              "it is no text file"},
-                      BadFile{"NullByte",
-                              [](const std::string& path) {
-                                testsupport::WriteFile(path, std::string("auth required a.so\0\n", 20));
-                              },
-                              "it is no text file"},
-                      BadFile{"HundredMegabytes",
-                              [](const std::string& path) {
-                                testsupport::WriteFile(path, "auth required pam_unix.so\n");
-                                ASSERT_EQ(truncate(path.c_str(), 100 << 20), 0);
-                              },
-                              "it has more than a mebibyte"},
-                      BadFile{"Pipe",
-                              [](const std::string& path) { ASSERT_EQ(mkfifo(path.c_str(), 0644), 0); },
-                              "it is not a regular file"}),
+    ::testing::Values(
+        BadFile{"Binary",
+                [](const std::string& path) {
+                  testsupport::WriteFile(path, std::string("\x7f"
+                                                           "ELF\x02\x01\0",
+                                                           7));
+                },
+                "it is no text file", BINARY_REMEDY, 1, "0x7f"},
+        BadFile{"NullByte",
+                [](const std::string& path) {
+                  testsupport::WriteFile(path, std::string("#\nauth required a.so\0\n", 22));
+                },
+                "it is no text file", BINARY_REMEDY, 2, "0x00"},
+        BadFile{"HundredMegabytes",
+                [](const std::string& path) {
+                  testsupport::WriteFile(path, "auth required pam_unix.so\n");
+                  ASSERT_EQ(truncate(path.c_str(), 100 << 20), 0);
+                },
+                "it has more than a mebibyte, so it is no configuration file", "put the right file there"},
+        BadFile{"Pipe", [](const std::string& path) { ASSERT_EQ(mkfifo(path.c_str(), 0644), 0); },
+                "it is not a regular file", "put a text file there"},
+        BadFile{"LinkToItself", [](const std::string& path) { ASSERT_EQ(symlink("bad", path.c_str()), 0); },
+                "Too many levels of symbolic links", "mend the symbolic links, which lead in a circle"}),
     [](const ::testing::TestParamInfo<BadFile>& bad) { return bad.param.name; });
+
+TEST_F(PamCommandTest, ACircleOfLinksHidesNoOtherService) {
+  ASSERT_EQ(symlink("second", (POLICIES + "first").c_str()), 0);
+  ASSERT_EQ(symlink("first", (POLICIES + "second").c_str()), 0);
+  const Outcome outcome = Pam({"show", "--all"});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.errors;
+  EXPECT_TRUE(Has(outcome.output, POLICIES + "sshd:2")) << outcome.output;
+  EXPECT_TRUE(Has(outcome.errors, POLICIES + "first:0: the file cannot be read: Too many")) << outcome.errors;
+}
+
+TEST_F(PamCommandTest, ALinkThatLeadsNowhereIsAFindingThatNamesItsTarget) {
+  ASSERT_EQ(symlink("../nowhere", (POLICIES + "lost").c_str()), 0);
+  const Outcome outcome = Pam({"check", "--json"});
+  EXPECT_EQ(outcome.exitCode, 13);
+  const nlohmann::json findings = outcome.Json()["findings"];
+  ASSERT_EQ(findings.size(), 1U);
+  EXPECT_EQ(findings[0]["file"], POLICIES + "lost");
+  EXPECT_EQ(findings[0]["reason"],
+            "the file cannot be read: it leads to '" + ROOT + "/etc/nowhere', which does not exist");
+}
+
+TEST_F(PamCommandTest, AModuleThatIsACircleOfLinksDoesNotExist) {
+  ASSERT_EQ(symlink("pam_circle.so", (MODULES + "pam_circle.so").c_str()), 0);
+  Policy("odd", "session required pam_circle.so\n");
+  const Outcome outcome = Pam({"check"});
+  EXPECT_EQ(outcome.exitCode, 13);
+  EXPECT_TRUE(Has(outcome.output, POLICIES + "odd:1: the module does not exist\n")) << outcome.output;
+}
+
+TEST_F(PamCommandTest, AFileWithCapitalsIsNoServiceAndAFinding) {
+  Policy("Web", "auth required pam_deny.so\n");
+  const Outcome outcome = Pam({"check", "--json"});
+  EXPECT_EQ(outcome.exitCode, 13);
+  EXPECT_EQ(outcome.Json()["findings"],
+            (nlohmann::json{{{"file", POLICIES + "Web"},
+                             {"line", nullptr},
+                             {"value", "Web"},
+                             {"reason",
+                              "libpam never opens this file: it takes the name of a service in "
+                              "lower case"},
+                             {"remedy", "rename the file to lower case, or remove it"}}}));
+  EXPECT_FALSE(Has(Pam({"show", "--all"}).output, "web"));
+}
+
+TEST_F(PamCommandTest, AFileWithCapitalsMayBeIncluded) {
+  Policy("Common", "session required pam_permit.so\n");
+  Policy("web", "@include Common\n");
+  const Outcome outcome = Pam({"check"});
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.output;
+}
 
 TEST_F(PamCommandTest, AFolderIsNoService) {
   testsupport::MakeFolders(POLICIES + "folder");

@@ -95,7 +95,7 @@ std::string Shown(const PolicySet& files) {
 Policy Resolve(const PolicySet& files) {
   const FileReader reader = ReaderOf(files);
   return ResolvePolicy("svc", [&reader](const std::string& path) {
-    return path == MODULE ? FileReading{testsupport::ReadFile(path), "", false} : reader(path);
+    return path == MODULE ? FileReading{testsupport::ReadFile(path), std::nullopt} : reader(path);
   });
 }
 

@@ -23,10 +23,10 @@ inline velmorctl::pam::FileReader ReaderOf(const PolicySet& files) {
       found = files.find(path.substr(folder.size()));
     }
     if (path == folder) {
-      return {"", "it is a folder", false};
+      return {"", velmorctl::pam::ReadingProblem{"it is a folder", "put a file there", 0, ""}};
     }
     return found == files.end() ? velmorctl::pam::FileReading()
-                                : velmorctl::pam::FileReading{found->second, "", false};
+                                : velmorctl::pam::FileReading{found->second, std::nullopt};
   };
 }
 

@@ -176,13 +176,32 @@ TEST(ResolverTest, WhatIsWrongInOtherIsItsOwnMatterWhereItIsNotUsed) {
   EXPECT_FALSE(Resolve({{"svc", ""}, {"other", "auth what b.so\n"}}).findings.empty());
 }
 
-TEST(ResolverTest, AFileThatCannotBeReadIsAFinding) {
+const velmorctl::pam::ReadingProblem binary = {"it is no text file", "put a text file there", 3, "0x00"};
+
+TEST(ResolverTest, AFileThatCannotBeReadIsAFindingWithItsPlace) {
   const Policy policy = ResolvePolicy("svc", [](const std::string& path) {
-    return path == "/etc/pam.d/svc" ? FileReading{std::nullopt, "Permission denied", true} : FileReading();
+    return path == "/etc/pam.d/svc" ? FileReading{std::nullopt, binary} : FileReading();
   });
   EXPECT_EQ(policy.state, State::Refused);
   ASSERT_FALSE(policy.findings.empty());
-  EXPECT_EQ(policy.findings[0].remedy, "run the command as root");
+  EXPECT_EQ(policy.findings[0].origin, (Origin{"/etc/pam.d/svc", 3}));
+  EXPECT_EQ(policy.findings[0].value, "0x00");
+  EXPECT_EQ(policy.findings[0].reason, "the file cannot be read: it is no text file");
+  EXPECT_EQ(policy.findings[0].remedy, "put a text file there");
+}
+
+TEST(ResolverTest, AnIncludedFileThatCannotBeReadIsAFindingOfTheLineThatIncludesIt) {
+  const Policy policy = ResolvePolicy("svc", [](const std::string& path) {
+    return path == "/etc/pam.d/svc"    ? FileReading{"\n@include part\n", std::nullopt}
+           : path == "/etc/pam.d/part" ? FileReading{std::nullopt, binary}
+                                       : FileReading();
+  });
+  ASSERT_EQ(policy.findings.size(), 1U);
+  EXPECT_EQ(policy.findings[0].origin, (Origin{"/etc/pam.d/svc", 2}));
+  EXPECT_EQ(policy.findings[0].value, "part");
+  EXPECT_EQ(policy.findings[0].reason,
+            "the included file \"/etc/pam.d/part\" cannot be read: it is no text file (line 3: 0x00)");
+  EXPECT_EQ(policy.findings[0].remedy, "put a text file there");
 }
 
 TEST(ResolverTest, NamesModulesWithoutFolderAndSuffix) {

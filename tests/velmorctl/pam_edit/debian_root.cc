@@ -104,7 +104,7 @@ Tree HostRoot::Files() const {
   Tree tree;
   for (const fs::directory_entry& entry : fs::recursive_directory_iterator(path_)) {
     const std::string name = entry.path().string().substr(path_.size());
-    if (!name.starts_with("/var/lib/quenix") && !entry.is_directory()) {
+    if (!name.starts_with("/var/lib/quenix") && !fs::is_directory(entry.symlink_status())) {
       tree[name] = Describe(entry.path());
     }
   }

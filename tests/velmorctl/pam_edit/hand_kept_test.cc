@@ -421,6 +421,17 @@ TEST_F(PamHandKeptTest, EnablingAgainTakesNoLineOutOfAServiceThatIsRefused) {
   EXPECT_EQ(root_.Files(), before);
 }
 
+TEST_F(PamHandKeptTest, LinksThatLeadNowhereHoldUpNoService) {
+  WriteShape(root_, PLAIN);
+  std::filesystem::create_symlink("circle", root_.Path() + "/etc/pam.d/circle");
+  std::filesystem::create_symlink("nowhere", root_.Path() + "/etc/pam.d/lost");
+  const Tree before = root_.Files();
+  EXPECT_EQ(root_.Pam({"enable"}).exitCode, 0);
+  EXPECT_TRUE(Has("ppp", "pam_ctlscript"));
+  EXPECT_EQ(root_.Pam({"disable"}).exitCode, 0);
+  EXPECT_EQ(root_.Files(), before);
+}
+
 TEST_F(PamHandKeptTest, AFileOfAPackageIsNotEdited) {
   const std::string text = "auth required pam_unix.so\naccount required pam_unix.so\n";
   root_.Write("/usr/lib/pam.d/vendor", text);

@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <filesystem>
+#include <optional>
 #include <system_error>
 
 #include "system_file/file_calls.h"
@@ -18,14 +19,14 @@ constexpr const char* libraryFolders[] = {"/lib", "/lib64", "/usr/lib", "/usr/li
 
 ServiceModules::ServiceModules(const RootFolder& root) : root_(root) {
   for (const std::string folder : libraryFolders) {
-    const std::string path = root_.Resolve(folder);
-    if (!IsFolder(path)) {
+    const std::optional<std::string> path = root_.Find(folder);
+    if (!path || !IsFolder(*path)) {
       continue;
     }
     folders_.push_back(folder);
     // Where several architectures share a system, each has a folder such as x86_64-linux-gnu.
     std::error_code error;
-    for (const auto& entry : std::filesystem::directory_iterator(path, error)) {
+    for (const auto& entry : std::filesystem::directory_iterator(*path, error)) {
       const std::string name = entry.path().filename();
       if (name.find("-linux-") != std::string::npos) {
         folders_.push_back(folder + "/" + name);
@@ -39,7 +40,8 @@ bool ServiceModules::Has(const std::string& service) const {
     return true;
   }
   return std::any_of(folders_.begin(), folders_.end(), [&](const std::string& folder) {
-    return access(root_.Resolve(folder + "/libnss_" + service + ".so.2").c_str(), F_OK) == 0;
+    const std::optional<std::string> path = root_.Find(folder + "/libnss_" + service + ".so.2");
+    return path && access(path->c_str(), F_OK) == 0;
   });
 }
 

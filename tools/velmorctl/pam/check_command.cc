@@ -1,5 +1,7 @@
 /// velmorctl pam check: whether the policies do what they should.
 #include <algorithm>
+#include <set>
+#include <utility>
 
 #include "output.h"
 #include "pam/check.h"
@@ -16,9 +18,22 @@ struct Options {
   std::string root = "/";
 };
 
+/// A file that was left unopened, of those that have capitals in their names.
+Finding NeverOpened(const std::string& file) {
+  return {{file, 0},
+          file.substr(file.rfind('/') + 1),
+          "libpam never opens this file: it takes the name of a service in lower case",
+          "rename the file to lower case, or remove it"};
+}
+
 ExitCode Check(const Options& options, Situation&) {
   PolicyRoot root{RootFolder(options.root)};
   CheckedSystem system = root.System();
+  std::set<std::string> opened;
+  system.read = [&opened, read = std::move(system.read)](const std::string& path) {
+    opened.insert(path);
+    return read(path);
+  };
   std::vector<Finding> found;
   std::vector<FileProblem> problems;
   for (const std::string& service : root.Services()) {
@@ -28,6 +43,11 @@ ExitCode Check(const Options& options, Situation&) {
         found.push_back(finding);
         problems.push_back(root.Shown(finding));
       }
+    }
+  }
+  for (const std::string& file : root.FilesWithCapitals()) {
+    if (!opened.contains(file)) {
+      problems.push_back(root.Shown(NeverOpened(file)));
     }
   }
   return PrintFindings(problems, "velmor.pam-check/1", options.json);

@@ -9,7 +9,6 @@
 #include "pam/module_answer.h"
 #include "pam/resolver.h"
 #include "system_file/file_calls.h"
-#include "system_file/snapshot.h"
 
 namespace velmorctl::pam {
 
@@ -24,9 +23,22 @@ std::vector<std::string> NamesIn(const std::string& folder, std::error_code& err
   return names;
 }
 
+bool HasCapitals(const std::string& name) {
+  return std::any_of(name.begin(), name.end(), [](char letter) { return letter >= 'A' && letter <= 'Z'; });
+}
+
+std::string NameOf(const std::string& path) {
+  return path.substr(path.rfind('/') + 1);
+}
+
 bool IsLeftOver(const std::string& name) {
   return name.starts_with('.') || name.ends_with('~') || name.find(".dpkg-") != std::string::npos ||
          name.find(".ucf-") != std::string::npos;
+}
+
+bool IsFolderIn(const RootFolder& root, const std::string& path) {
+  std::optional<std::string> found = root.Find(path);
+  return found && IsFolder(*found);
 }
 
 /// Debian's libpam looks into one folder, whose name holds the machine's architecture, and then into
@@ -40,7 +52,7 @@ std::vector<std::string> ModuleFolders(const RootFolder& root) {
     for (const std::string& name : names) {
       std::string folder = std::string(libraries) + "/" + name + (name.empty() ? "" : "/") + "security";
       bool fits = name.empty() || name.find("-linux-") != std::string::npos;
-      if (fits && IsFolder(root.Resolve(folder))) {
+      if (fits && IsFolderIn(root, folder)) {
         folders.push_back(folder);
       }
     }
@@ -50,16 +62,29 @@ std::vector<std::string> ModuleFolders(const RootFolder& root) {
 
 }  // namespace
 
+FileReading ReadingOf(const SnapshotInspection& inspection) {
+  const std::optional<FileProblem>& problem = inspection.problem;
+  if (!problem) {
+    return {inspection.snapshot.content, std::nullopt};
+  }
+  if (problem->kind == FileProblem::Kind::Missing && !inspection.snapshot.isLink) {
+    return {};
+  }
+  return {std::nullopt, ReadingProblem{problem->reason, problem->remedy,
+                                       static_cast<std::size_t>(problem->line), problem->value}};
+}
+
 PolicyRoot::PolicyRoot(RootFolder root) : root_(std::move(root)), moduleFolders_(ModuleFolders(root_)) {}
 
-std::vector<std::string> PolicyRoot::Services() const {
-  std::set<std::string> services;
+std::set<std::string> PolicyRoot::Files() const {
+  std::set<std::string> files;
   bool found = false;
   for (const char* folder : policyFolders) {
     std::error_code error;
     for (const std::string& name : NamesIn(root_.Resolve(folder), error)) {
-      if (!IsLeftOver(name) && !IsFolder(root_.Resolve(std::string(folder) + "/" + name))) {
-        services.insert(name);
+      std::string path = std::string(folder) + "/" + name;
+      if (!IsLeftOver(name) && !IsFolderIn(root_, path)) {
+        files.insert(std::move(path));
       }
     }
     if (error && error != std::errc::no_such_file_or_directory) {
@@ -74,21 +99,31 @@ std::vector<std::string> PolicyRoot::Services() const {
         .Detail("file", root_.Shown(policyFolders[0]))
         .Try("give --root the folder of a system that uses PAM");
   }
+  return files;
+}
+
+std::vector<std::string> PolicyRoot::Services() const {
+  std::set<std::string> services;
+  for (const std::string& file : Files()) {
+    if (!HasCapitals(NameOf(file))) {
+      services.insert(NameOf(file));
+    }
+  }
   return {services.begin(), services.end()};
 }
 
+std::vector<std::string> PolicyRoot::FilesWithCapitals() const {
+  std::set<std::string> files = Files();
+  std::erase_if(files, [](const std::string& file) { return !HasCapitals(NameOf(file)); });
+  return {files.begin(), files.end()};
+}
+
 FileReading PolicyRoot::Read(const std::string& path) const {
-  if (IsFolder(root_.Resolve(path))) {
-    return {"", "it is a folder", false};
+  if (IsFolderIn(root_, path)) {
+    return {"",
+            ReadingProblem{"it is a folder", "put a text file there, or correct or remove the line", 0, ""}};
   }
-  SnapshotInspection inspection = InspectSystemFile(root_, path);
-  if (!inspection.problem) {
-    return {std::move(inspection.snapshot.content), "", false};
-  }
-  if (inspection.problem->kind == FileProblem::Kind::Missing) {
-    return {};
-  }
-  return {std::nullopt, inspection.problem->reason, inspection.problem->needsRoot};
+  return ReadingOf(InspectSystemFile(root_, path));
 }
 
 bool PolicyRoot::HasModule(const std::string& module) const {
@@ -101,8 +136,9 @@ bool PolicyRoot::HasModule(const std::string& module) const {
 }
 
 bool PolicyRoot::HasFile(const std::string& path) const {
+  std::optional<std::string> found = root_.Find(path);
   std::error_code error;
-  return std::filesystem::is_regular_file(root_.Resolve(path), error);
+  return found && std::filesystem::is_regular_file(*found, error);
 }
 
 std::set<std::string> PolicyRoot::DirectoryModules() const {

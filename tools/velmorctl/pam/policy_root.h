@@ -12,8 +12,12 @@
 #include "pam/policy_files.h"
 #include "pam/stack.h"
 #include "system_file/root_folder.h"
+#include "system_file/snapshot.h"
 
 namespace velmorctl::pam {
+
+/// What the inspection of a file says to the reader of a policy.
+FileReading ReadingOf(const SnapshotInspection& inspection);
 
 /// For one thread; what it hands out refers to it.
 class PolicyRoot {
@@ -21,9 +25,15 @@ class PolicyRoot {
   explicit PolicyRoot(RootFolder root);
 
   /// The names of the services, in ascending order, without what packages and editors leave beside them
-  /// (names with ".dpkg-" or ".ucf-", or that begin with "." or end in "~"). Throws Failure (Configuration)
-  /// when there is no folder of policies, or it cannot be read.
+  /// (names with ".dpkg-" or ".ucf-", or that begin with "." or end in "~") and without those of
+  /// FilesWithCapitals(). Throws Failure (Configuration) when there is no folder of policies, or it cannot be
+  /// read.
   std::vector<std::string> Services() const;
+
+  /// The files that look like those of services and have capitals in their names, by their paths in ascending
+  /// order. libpam takes the name of a service in lower case, so only an include opens them. Throws what
+  /// Services() throws.
+  std::vector<std::string> FilesWithCapitals() const;
 
   /// Reads a policy file.
   FileReading Read(const std::string& path) const;
@@ -52,6 +62,7 @@ class PolicyRoot {
   std::string Shown(const std::string& file) const { return root_.Shown(file); }
 
  private:
+  std::set<std::string> Files() const;
   std::set<std::string> DirectoryModules() const;
 
   RootFolder root_;

@@ -186,7 +186,7 @@ class FileResolver {
       throw FatalPolicy();
     }
     FileReading reading = read_(frame.path);
-    if (!reading.content || !reading.problem.empty()) {
+    if (!reading.content || reading.problem) {
       ReportUnreadable(frame.path, reading, line, origin);
     }
     return reading.content && ParseContent(frame, *reading.content);
@@ -194,14 +194,15 @@ class FileResolver {
 
   void ReportUnreadable(const std::string& path, const FileReading& reading, const PolicyLine& line,
                         const Origin& origin) {
-    std::string remedy = "make the file, or correct or remove the line";
-    if (!reading.problem.empty()) {
-      remedy = reading.needsRoot ? "run the command as root" : "make \"" + path + "\" a readable text file";
+    const std::string file = "the included file \"" + path + "\" ";
+    if (!reading.problem) {
+      Report(origin, line.target, file + "does not exist", "make the file, or correct or remove the line");
+      return;
     }
-    Report(origin, line.target,
-           "the included file \"" + path + "\" " +
-               (reading.problem.empty() ? "does not exist" : "cannot be read: " + reading.problem),
-           remedy);
+    const ReadingProblem& problem = *reading.problem;
+    const std::string place =
+        problem.line > 0 ? " (line " + std::to_string(problem.line) + ": " + problem.value + ")" : "";
+    Report(origin, line.target, file + "cannot be read: " + problem.reason + place, problem.remedy);
   }
 
   const FileReader& read_;
@@ -241,11 +242,11 @@ class ServiceResolver {
     for (const char* folder : policyFolders) {
       std::string path = std::string(folder) + "/" + service;
       FileReading reading = read_(path);
-      if (!reading.problem.empty()) {
-        findings.push_back({{path, 0},
-                            "",
-                            "the file cannot be read: " + reading.problem,
-                            reading.needsRoot ? "run the command as root" : "make it a readable text file"});
+      if (const std::optional<ReadingProblem>& problem = reading.problem) {
+        findings.push_back({{path, problem->line},
+                            problem->value,
+                            "the file cannot be read: " + problem->reason,
+                            problem->remedy});
       }
       if (reading.content) {
         return Definition{path, std::move(*reading.content)};

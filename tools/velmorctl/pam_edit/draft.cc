@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <utility>
 
+#include "pam/policy_root.h"
 #include "system_file/file_calls.h"
 
 namespace velmorctl::pam {
@@ -59,24 +60,28 @@ void Draft::Remove(const std::string& name) {
 }
 
 bool Draft::SameFile(const std::string& one, const std::string& other) const {
-  return root_.Resolve(one) == root_.Resolve(other);
+  const std::optional<std::string> path = root_.Find(one);
+  return path && path == root_.Find(other);
 }
 
 FileReader Draft::Reader() const {
   return [this](const std::string& name) -> FileReading {
-    std::string path = root_.Resolve(name);
-    if (IsFolder(path)) {
-      return {"", "", false};
+    std::optional<std::string> path = root_.Find(name);
+    if (!path) {
+      return ReadingOf(InspectSystemFile(root_, name));
     }
-    if (!FindEdit(path) && !originals_->contains(path)) {
+    if (IsFolder(*path)) {
+      return {"", std::nullopt};
+    }
+    if (!FindEdit(*path) && !originals_->contains(*path)) {
       SnapshotInspection inspection = InspectSystemFile(root_, name);
-      bool missing = inspection.problem && inspection.problem->kind == FileProblem::Kind::Missing;
-      if (inspection.problem && !missing) {
-        return {std::nullopt, inspection.problem->reason, inspection.problem->needsRoot};
+      FileReading reading = ReadingOf(inspection);
+      if (reading.problem) {
+        return reading;
       }
-      originals_->emplace(path, std::move(inspection.snapshot));
+      originals_->emplace(*path, std::move(inspection.snapshot));
     }
-    return {Content(name), "", false};
+    return {Content(name), std::nullopt};
   };
 }
 

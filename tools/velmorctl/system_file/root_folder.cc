@@ -62,6 +62,16 @@ std::string RootFolder::Option() const {
 }
 
 std::string RootFolder::Resolve(const std::string& name) const {
+  std::optional<std::string> path = Find(name);
+  if (!path) {
+    throw Failure(ExitCode::Configuration, "cannot find '" + Shown(name) + "': " + SystemErrorText(ELOOP))
+        .Detail("file", Shown(name))
+        .Try(circleRemedy);
+  }
+  return *std::move(path);
+}
+
+std::optional<std::string> RootFolder::Find(const std::string& name) const {
   std::deque<std::string> parts;
   PutInFront(name, parts);
   std::vector<std::string> walked;
@@ -88,9 +98,7 @@ std::string RootFolder::Resolve(const std::string& name) const {
       continue;
     }
     if (++links > mostLinks) {
-      throw Failure(ExitCode::Configuration, "cannot find '" + Shown(name) + "': " + SystemErrorText(ELOOP))
-          .Detail("file", Shown(name))
-          .Try("mend the symbolic links, which lead in a circle");
+      return std::nullopt;
     }
     walked.pop_back();
     if (target.front() == '/') {
@@ -100,6 +108,13 @@ std::string RootFolder::Resolve(const std::string& name) const {
   }
   const std::string path = pathSoFar();
   return path.empty() ? "/" : path;
+}
+
+bool RootFolder::IsLink(const std::string& name) const {
+  const std::filesystem::path path(name);
+  const std::optional<std::string> folder = Find(path.parent_path());
+  std::error_code error;
+  return folder && std::filesystem::is_symlink(std::filesystem::path(*folder) / path.filename(), error);
 }
 
 std::string RootFolder::MakeFolder(const std::string& name, mode_t mode) const {

@@ -5,9 +5,12 @@
 #include <sys/types.h>
 
 #include <CLI/App.hpp>
+#include <optional>
 #include <string>
 
 namespace velmorctl {
+
+inline constexpr char circleRemedy[] = "mend the symbolic links, which lead in a circle";
 
 /// Adds the option --root.
 void AddRootOption(CLI::App& command, std::string& root);
@@ -26,6 +29,12 @@ class RootFolder {
   /// and never lies outside. What does not exist, or may not be looked at, is left as it is named, for the
   /// call that uses the path to report. Throws Failure (Configuration) for a circle of links.
   std::string Resolve(const std::string& name) const;
+
+  /// The same; nothing for a circle of links.
+  std::optional<std::string> Find(const std::string& name) const;
+
+  /// Whether what is called `name` is a symbolic link itself, wherever it leads.
+  bool IsLink(const std::string& name) const;
 
   /// Makes the folder `name` and those above it where they are missing, with this mode whatever the umask,
   /// durably, and returns its path on the running system. Throws Failure (Configuration).

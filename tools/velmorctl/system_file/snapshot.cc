@@ -36,10 +36,9 @@ FileProblem ProblemOf(const Snapshot& snapshot, Kind kind, const std::string& re
 
 FileProblem CannotRead(const Snapshot& snapshot, int errorNumber) {
   if (errorNumber == ENOENT || errorNumber == ENOTDIR) {
-    const bool isLink = snapshot.path != snapshot.shown;
     return ProblemOf(
         snapshot, Kind::Missing,
-        isLink ? "it leads to '" + snapshot.path + "', which does not exist" : "it does not exist",
+        snapshot.isLink ? "it leads to '" + snapshot.path + "', which does not exist" : "it does not exist",
         "install the package that brings it again, or put a copy back");
   }
   FileProblem problem =
@@ -168,8 +167,13 @@ SnapshotInspection InspectSystemFile(const RootFolder& root, const std::string& 
   Snapshot& snapshot = inspection.snapshot;
   snapshot.name = name;
   snapshot.shown = root.Shown(name);
-  snapshot.path = root.Resolve(name);
-  inspection.problem = Read(snapshot);
+  snapshot.isLink = root.IsLink(name);
+  if (std::optional<std::string> path = root.Find(name)) {
+    snapshot.path = *std::move(path);
+    inspection.problem = Read(snapshot);
+  } else {
+    inspection.problem = ProblemOf(snapshot, Kind::Unreadable, SystemErrorText(ELOOP), circleRemedy);
+  }
   if (inspection.problem) {
     snapshot.content.clear();
     snapshot.identity.reset();

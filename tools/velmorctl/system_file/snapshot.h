@@ -32,7 +32,8 @@ struct FileIdentity {
 
 struct Snapshot {
   std::string name;                      /// inside the root, for example /etc/nsswitch.conf
-  std::string path;                      /// on the running system, where links have led
+  std::string path;                      /// on the running system, where links have led; empty for a circle
+  bool isLink = false;                   /// the name itself is a symbolic link
   std::string shown;                     /// as messages name the file: the root and the name
   std::optional<FileIdentity> identity;  /// nothing when there is no such file
   std::string content;
@@ -46,9 +47,9 @@ struct SnapshotInspection {
 };
 
 /// Reads the file called `name` inside the root. Never blocks on a pipe or a device, and reads no more than
-/// greatestSystemFile. A problem is: no such file (Missing); not a regular file, not readable, greater than
-/// that, changed all the time by others (Unreadable); a NUL byte or another control character that no text
-/// file has (Malformed, with its line).
+/// greatestSystemFile. A problem is: no such file (Missing); a circle of links, not a regular file, not
+/// readable, greater than that, changed all the time by others (Unreadable); a NUL byte or another control
+/// character that no text file has (Malformed, with its line).
 SnapshotInspection InspectSystemFile(const RootFolder& root, const std::string& name);
 
 /// The same for a file that has to be there; throws the problem as a Failure: Configuration, or NeedsRoot
