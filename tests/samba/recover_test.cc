@@ -7,14 +7,19 @@ extern "C" {
 #include <tdb.h>
 }
 
+#include <cerrno>
+
 #include "common/attempt_log.h"
 #include "common/paths.h"
+#include "common/smb_conf.h"
 #include "common/state.h"
+#include "expect_failure.h"
 #include "helper/before_join.h"
 #include "helper/journal.h"
 #include "helper/operations.h"
 #include "helper/undo.h"
 #include "support/files.h"
+#include "support/interpose.h"
 
 namespace sambaprovider {
 namespace {
@@ -77,6 +82,32 @@ TEST_F(RecoverTest, AnInterruptedJoinIsTakenBack) {
   EXPECT_FALSE(testsupport::Exists(paths::kJournal));
   EXPECT_FALSE(testsupport::Exists(paths::kBeforeFolder));
 }
+
+// A join writes smb.conf twice. The parameter says how many files of the second time were replaced.
+class KilledWritingTest : public RecoverTest, public testing::WithParamInterface<int> {
+ protected:
+  static void WriteUntilKilled(const std::string& text, int filesReplaced) {
+    int left = filesReplaced;
+    const testsupport::TakeOver kill(testsupport::calls::rename, [&left](const char* from, const char* to) {
+      if (left-- > 0) return testsupport::calls::rename.Real(from, to);
+      errno = EIO;
+      return -1;
+    });
+    EXPECT_FAILURE(WriteSmbConf(text), 1359);
+  }
+};
+
+TEST_P(KilledWritingTest, TheSmbConfFromBeforeTheJoinComesBack) {
+  before_join::PutAside();
+  SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", false});
+  WriteSmbConf("[global]\n");
+  WriteUntilKilled("[global]\n  workgroup = CORP\n", GetParam());
+  RunRecover();
+  EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "before");
+  EXPECT_EQ(testsupport::NamesIn(paths::kStateFolder), (std::vector<std::string>{"attempts.log"}));
+}
+
+INSTANTIATE_TEST_SUITE_P(AfterEachFile, KilledWritingTest, testing::Values(0, 1, 2));
 
 TEST_F(RecoverTest, AJoinThatIsTakenBackIsForgotten) {
   before_join::PutAside();

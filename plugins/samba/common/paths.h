@@ -19,6 +19,8 @@ inline constexpr const char* kJournal = "/var/lib/quenix/samba/journal.json";
 inline constexpr const char* kBeforeFolder = "/var/lib/quenix/samba/before";
 /// Byte for byte what this provider wrote to smb.conf last; tells our file from one that somebody changed.
 inline constexpr const char* kWrittenSmbConf = "/var/lib/quenix/samba/smb.conf.written";
+/// What it is about to write there; only while it does so.
+inline constexpr const char* kNextSmbConf = "/var/lib/quenix/samba/smb.conf.next";
 
 inline constexpr const char* kSmbConf = "/etc/samba/smb.conf";
 inline constexpr const char* kDistributionSmbConf = "/usr/share/samba/smb.conf";

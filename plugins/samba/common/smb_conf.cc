@@ -78,10 +78,15 @@ SmbConfOwner OwnerOfSmbConf(const std::optional<std::string>& present,
   return SmbConfOwner::kAdministrator;
 }
 
+SmbConfOwner OwnerOfPresentSmbConf() {
+  const auto present = ReadFile(paths::kSmbConf);
+  // A kill may have come between the new file and the note that it is the last one.
+  if (present && present == ReadFile(paths::kNextSmbConf)) return SmbConfOwner::kProvider;
+  return OwnerOfSmbConf(present, ReadFile(paths::kWrittenSmbConf), ReadFile(paths::kDistributionSmbConf));
+}
+
 void RequireSmbConfIsReplaceable() {
-  const SmbConfOwner owner = OwnerOfSmbConf(ReadFile(paths::kSmbConf), ReadFile(paths::kWrittenSmbConf),
-                                            ReadFile(paths::kDistributionSmbConf));
-  if (owner != SmbConfOwner::kAdministrator) return;
+  if (OwnerOfPresentSmbConf() != SmbConfOwner::kAdministrator) return;
   throw Failure(
       kHostConfigurationInTheWay,
       std::string(paths::kSmbConf) +
@@ -91,8 +96,15 @@ void RequireSmbConfIsReplaceable() {
 }
 
 void WriteSmbConf(const std::string& text) {
-  ReplaceFile(paths::kWrittenSmbConf, text, 0644);
+  ReplaceFile(paths::kNextSmbConf, text, 0644);
   ReplaceFile(paths::kSmbConf, text, 0644);
+  ReplaceFile(paths::kWrittenSmbConf, text, 0644);
+  RemoveFile(paths::kNextSmbConf);
+}
+
+void ForgetWrittenSmbConf() {
+  RemoveFile(paths::kWrittenSmbConf);
+  RemoveFile(paths::kNextSmbConf);
 }
 
 }  // namespace sambaprovider

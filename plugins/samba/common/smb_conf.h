@@ -26,11 +26,18 @@ SmbConfOwner OwnerOfSmbConf(const std::optional<std::string>& present,
                             const std::optional<std::string>& written,
                             const std::optional<std::string>& distribution);
 
-/// Reads the three files. Throws Failure (kHostConfigurationInTheWay) when smb.conf is an administrator's.
+/// Decides it for the files that are there. Throws Failure (kInternalError) when one cannot be read.
+SmbConfOwner OwnerOfPresentSmbConf();
+
+/// Throws Failure (kHostConfigurationInTheWay) when smb.conf is an administrator's.
 void RequireSmbConfIsReplaceable();
 
-/// Writes smb.conf, and first remembers the text as ours. Throws Failure (kInternalError).
+/// Writes smb.conf and remembers the text as ours. A kill at any moment leaves an smb.conf that is known as
+/// ours, or the one from before the first write. Throws Failure (kInternalError).
 void WriteSmbConf(const std::string& text);
+
+/// Forgets what was written, as when smb.conf is somebody else's again. Throws Failure (kInternalError).
+void ForgetWrittenSmbConf();
 
 }  // namespace sambaprovider
 

@@ -22,11 +22,6 @@ void GiveBack(const std::string& copy, const std::string& to) {
   if (!CopyFile(copy, to)) RemoveFile(to);
 }
 
-bool SmbConfIsAdministrators() {
-  return OwnerOfSmbConf(ReadFile(paths::kSmbConf), ReadFile(paths::kWrittenSmbConf),
-                        ReadFile(paths::kDistributionSmbConf)) == SmbConfOwner::kAdministrator;
-}
-
 }  // namespace
 
 void PutAside() {
@@ -39,7 +34,7 @@ void PutAside() {
 
 void GiveBack() {
   if (!FileExists(paths::kBeforeFolder)) return;
-  if (!SmbConfIsAdministrators()) GiveBack(kSmbConfCopy, paths::kSmbConf);
+  if (OwnerOfPresentSmbConf() != SmbConfOwner::kAdministrator) GiveBack(kSmbConfCopy, paths::kSmbConf);
   GiveBack(kKeytabCopy, paths::kKeytab);
 }
 
@@ -48,7 +43,7 @@ bool ServiceWasRunning() {
 }
 
 void DropCopies() {
-  RemoveFile(paths::kWrittenSmbConf);
+  ForgetWrittenSmbConf();
   RemoveFolder(paths::kBeforeFolder);
 }
 

@@ -1,8 +1,6 @@
 #include "helper/undo.h"
 
-#include "common/files.h"
 #include "common/names.h"
-#include "common/paths.h"
 #include "common/smb_conf.h"
 #include "common/state.h"
 #include "common/status.h"
@@ -56,11 +54,6 @@ std::string ForgetJoin() {
   return "the domain is forgotten";
 }
 
-bool SmbConfIsOurs() {
-  return OwnerOfSmbConf(ReadFile(paths::kSmbConf), ReadFile(paths::kWrittenSmbConf), std::nullopt) ==
-         SmbConfOwner::kProvider;
-}
-
 void RestoreService() {
   winbind_service::Stop();
   if (before_join::ServiceWasRunning()) winbind_service::Start();
@@ -73,7 +66,7 @@ void UndoJoin(const AttemptLog& log, const Journal& journal, const UndoAccount* 
   // First, since a run after a crash takes a join for whole that is remembered.
   const bool forgotten = Try(log, ForgetJoin);
   // libnetapi finds the secrets by the domain in smb.conf, so this comes before smb.conf is given back.
-  if (SmbConfIsOurs()) Try(log, RemoveSecrets);
+  if (OwnerOfPresentSmbConf() == SmbConfOwner::kProvider) Try(log, RemoveSecrets);
   if (journal.accountIsNew && account != nullptr) {
     Try(log, [&] {
       return RemoveAccount({journal.dnsDomain, LocateControllers(journal.dnsDomain), account->user,
