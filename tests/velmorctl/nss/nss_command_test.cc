@@ -127,6 +127,20 @@ TEST_P(StockFileTest, IsTheSameAfterADryRun) {
   EXPECT_EQ(testsupport::NamesIn(root_.Path()), std::vector<std::string>{"etc"});
 }
 
+TEST_P(StockFileTest, IsTheSameAfterADryRunOfARemoval) {
+  Nss({"add", "passwd", "winbind"});
+  const std::string added = ReadFile(file_);
+  const struct stat before = StatusOf(file_);
+  const std::vector<std::string> backups = testsupport::NamesIn(root_.Path() + BACKUPS);
+  const Outcome outcome = Nss({"remove", "passwd", "winbind", "--dry-run"});
+  EXPECT_EQ(outcome.exitCode, 0);
+  ExpectIn(outcome.output, "--- a/etc/nsswitch.conf\n+++ b/etc/nsswitch.conf\n");
+  ExpectIn(outcome.output, "Nothing was written.\n");
+  EXPECT_EQ(ReadFile(file_), added);
+  EXPECT_TRUE(SameFile(before, StatusOf(file_)));
+  EXPECT_EQ(testsupport::NamesIn(root_.Path() + BACKUPS), backups);
+}
+
 INSTANTIATE_TEST_SUITE_P(Each, StockFileTest, ::testing::ValuesIn(StockFiles()),
                          [](const auto& test) { return std::string(test.param.name); });
 

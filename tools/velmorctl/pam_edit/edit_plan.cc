@@ -5,7 +5,10 @@
 
 #include "failure.h"
 #include "pam/check.h"
+#include "pam/login.h"
+#include "pam/policy_line.h"
 #include "pam/policy_root.h"
+#include "pam/policy_text.h"
 #include "pam/resolver.h"
 #include "pam_edit/edit_spot.h"
 #include "pam_edit/login_proof.h"
@@ -14,6 +17,7 @@
 #include "pam_edit/profile_change.h"
 #include "pam_edit/profile_tool.h"
 #include "pam_edit/stack_difference.h"
+#include "pam_edit/written_policies.h"
 
 namespace velmorctl::pam {
 
@@ -40,18 +44,24 @@ std::set<std::string> FilesOf(const Policy& policy) {
   return files;
 }
 
-std::set<std::string> FilesOf(const Policies& policies) {
-  std::set<std::string> files;
-  for (const Policy& policy : policies) {
-    files.merge(FilesOf(policy));
+/// What the services are written in: libpam may refuse a policy, or pass over a file, with own lines in it.
+WrittenPolicies ReadWritten(const Draft& draft, const std::vector<std::string>& services) {
+  std::vector<std::string> files;
+  for (const std::string& service : services) {
+    for (const char* folder : policyFolders) {
+      files.push_back(std::string(folder) + "/" + service);
+    }
   }
-  return files;
+  return ReadWrittenPolicies(std::move(files), draft.Reader());
 }
 
-/// Takes out what was put in before.
-Draft WithoutOwn(Draft draft) {
-  for (const std::string& file : FilesOf(ResolveAll(draft))) {
-    std::string content = draft.Content(file).value_or("");
+WrittenPolicies ReadAllWritten(const Draft& draft) {
+  return ReadWritten(draft, PolicyRoot(draft.Root()).Services());
+}
+
+/// Takes out what was put in before, whatever libpam makes of the policies now.
+Draft WithoutOwn(Draft draft, const WrittenPolicies& written) {
+  for (const auto& [file, content] : written.contents) {
     std::string rest = WithoutOwnLines(content);
     if (rest != content) {
       draft.Write(file, rest);
@@ -81,6 +91,19 @@ bool IsChanged(const Policy& one, const Policy& other) {
                      [](const Stack& left, const Stack& right) { return left.size() == right.size(); });
 }
 
+std::size_t OwnLinesIn(const Draft& draft, const std::string& file) {
+  return ModulesOfOwnLines(draft.Reader()(file).content.value_or("")).size();
+}
+
+/// Nobody can tell what is in them, and so nothing can be put in or taken out.
+std::vector<std::string> NotesOnUnreadable(const WrittenPolicies& written) {
+  std::vector<std::string> notes;
+  for (const auto& [file, problem] : written.unreadable) {
+    notes.push_back(file + " cannot be read (" + problem + "), and stays as it is.");
+  }
+  return notes;
+}
+
 std::string Place(const Origin& origin) {
   return origin.file + ", line " + std::to_string(origin.line);
 }
@@ -88,7 +111,11 @@ std::string Place(const Origin& origin) {
 class EnablePlanner {
  public:
   EnablePlanner(const RootFolder& root, const DirectoryModule& module)
-      : module_(module), current_(root), bare_(WithoutOwn(current_)), policies_(ResolveAll(bare_)) {}
+      : module_(module),
+        current_(root),
+        written_(ReadAllWritten(current_)),
+        bare_(WithoutOwn(current_, written_)),
+        policies_(ResolveAll(bare_)) {}
 
   EditPlan Run() {
     Choose();
@@ -98,6 +125,7 @@ class EnablePlanner {
       if (refused.empty()) {
         RequireKept(next);
         NoteShutOut(next);
+        NoteUnreadable();
         return {std::move(next), std::move(notes_), std::move(refusals_)};
       }
       for (Refusal& refusal : refused) {
@@ -256,21 +284,40 @@ class EnablePlanner {
     }
   }
 
-  /// A refused service is to stay as it is: what an earlier "enable" has put in must not go by the way.
+  void NoteUnreadable() {
+    for (const std::string& note : NotesOnUnreadable(written_)) {
+      AddNote(note);
+    }
+  }
+
+  /// A refused service is to stay as it is, and one that libpam cannot use is somebody's mistake: what an
+  /// earlier "enable" has put in must not go by the way.
   void RequireKept(const Draft& next) const {
-    bool profileGoes = !ModulesOfProfile(current_).empty() && ModulesOfProfile(next).empty();
     // Behind the services that share files with it stands the one that is the reason.
     for (auto refusal = refusals_.rbegin(); refusal != refusals_.rend(); ++refusal) {
-      for (const std::string& file : FilesOf(PolicyOf(refusal->service))) {
-        bool linesGo = ModulesOfOwnLines(next.Content(file).value_or("")).size() <
-                       ModulesOfOwnLines(current_.Content(file).value_or("")).size();
-        if (linesGo || (profileGoes && IsKeptByProfiles(bare_, file))) {
-          throw Failure(ExitCode::HostNotReady,
-                        "the service '" + refusal->service + "' cannot keep what was put into its files")
-              .Detail("file", bare_.Root().Shown(file))
-              .Detail("reason", refusal->reason)
-              .Try("correct or remove the service; nothing was changed");
-        }
+      RequireKept(next, *refusal);
+    }
+    for (const Policy& policy : policies_) {
+      if (policy.state != Policy::State::Usable) {
+        RequireKept(next, {policy.service, WhyUnusable(policy)});
+      }
+    }
+  }
+
+  void RequireKept(const Draft& next, const Refusal& refusal) const {
+    bool profileGoes = !ModulesOfProfile(current_).empty() && ModulesOfProfile(next).empty();
+    std::set<std::string> files = FilesOf(PolicyOf(refusal.service));
+    for (const auto& [file, content] : ReadWritten(current_, {refusal.service}).contents) {
+      files.insert(file);
+    }
+    for (const std::string& file : files) {
+      bool linesGo = OwnLinesIn(next, file) < OwnLinesIn(current_, file);
+      if (linesGo || (profileGoes && IsKeptByProfiles(bare_, file))) {
+        throw Failure(ExitCode::HostNotReady,
+                      "the service '" + refusal.service + "' cannot keep what was put into its files")
+            .Detail("file", bare_.Root().Shown(file))
+            .Detail("reason", refusal.reason)
+            .Try("correct or remove the service; nothing was changed");
       }
     }
   }
@@ -291,7 +338,7 @@ class EnablePlanner {
     for (const std::string& file : FilesOf(policy)) {
       std::string before = bare_.Content(file).value_or("");
       std::string after = next.Content(file).value_or("");
-      if (!ModelAgrees(before, after, {module_.name})) {
+      if (!ModelSeesOwnAdded(before, after, {module_.name})) {
         return "read another way, " + file + " would change in more than was asked for";
       }
       if (!IsKeptByProfiles(bare_, file) && WithoutOwnLines(after) != before) {
@@ -334,6 +381,7 @@ class EnablePlanner {
 
   const DirectoryModule& module_;
   Draft current_;
+  WrittenPolicies written_;
   Draft bare_;
   Policies policies_;
   std::vector<Meant> meant_;
@@ -354,28 +402,53 @@ void RequireModule(const RootFolder& root, const DirectoryModule& module) {
   }
 }
 
-OwnModules OwnModulesIn(const Draft& draft, const Policies& policies) {
+OwnModules OwnModulesIn(const Draft& draft, const WrittenPolicies& written) {
   OwnModules own = ModulesOfProfile(draft);
-  for (const std::string& file : FilesOf(policies)) {
-    std::vector<std::string> modules = ModulesOfOwnLines(draft.Content(file).value_or(""));
+  for (const auto& [file, content] : written.contents) {
+    std::vector<std::string> modules = ModulesOfOwnLines(content);
     own.insert(modules.begin(), modules.end());
   }
   return own;
 }
 
-std::vector<std::string> NotesOnRemaining(const Policies& policies, const std::string& module) {
-  std::set<std::string> notes;
-  for (const Policy& policy : policies) {
-    for (const Stack& stack : policy.stacks) {
-      for (const StackEntry& entry : stack) {
-        if (ModuleName(entry.module) == ModuleName(module)) {
-          notes.insert(Place(entry.origin) + " calls " + entry.module +
-                       " too; velmorctl did not write that, and it stays.");
-        }
+void RequireAsBefore(const Policies& before, const Policies& after, const OwnModules& own) {
+  for (std::size_t index = 0; index < before.size(); ++index) {
+    std::string problem = UnexpectedDifference(after[index], before[index], own);
+    if (!problem.empty()) {
+      throw Failure(ExitCode::HostNotReady,
+                    "the service '" + before[index].service + "' would not be what it was without the module")
+          .Detail("reason", problem)
+          .Try("velmorctl pam restore, if nothing else was changed since");
+    }
+  }
+}
+
+void RequireModelAgrees(const WrittenPolicies& before, const WrittenPolicies& after, const RootFolder& root,
+                        const OwnModules& own) {
+  for (const auto& [file, content] : before.contents) {
+    auto now = after.contents.find(file);
+    if (now != after.contents.end() && !ModelSeesOwnRemoved(content, now->second, own)) {
+      throw Failure(ExitCode::HostNotReady, "a policy file would not be what it was without the module")
+          .Detail("file", root.Shown(file))
+          .Detail("reason", "read another way, it would change in more than was asked for")
+          .Try("velmorctl pam restore, if nothing else was changed since");
+    }
+  }
+}
+
+std::vector<std::string> NotesOnRemaining(const WrittenPolicies& written, const std::string& module) {
+  std::vector<std::string> notes;
+  for (const auto& [file, content] : written.contents) {
+    PolicyText text(content);
+    for (const LogicalLine& logical : text.Lines()) {
+      PolicyLine line = ReadPolicyLine(logical.text);
+      if (line.kind == PolicyLine::Kind::Module && ModuleName(line.target) == ModuleName(module)) {
+        notes.push_back(Place({file, logical.firstLine}) + " calls " + line.target +
+                        " too; velmorctl did not write that, and it stays.");
       }
     }
   }
-  return {notes.begin(), notes.end()};
+  return notes;
 }
 
 }  // namespace
@@ -387,20 +460,18 @@ EditPlan PlanEnable(const RootFolder& root, const DirectoryModule& module) {
 
 EditPlan PlanDisable(const RootFolder& root, const std::optional<DirectoryModule>& module) {
   Draft current(root);
-  Policies before = ResolveAll(current);
-  Draft bare = WithoutOwn(current);
-  Policies after = ResolveAll(bare);
+  WrittenPolicies before = ReadAllWritten(current);
+  Draft bare = WithoutOwn(current, before);
+  WrittenPolicies after = ReadAllWritten(bare);
   OwnModules own = OwnModulesIn(current, before);
-  for (std::size_t index = 0; index < before.size(); ++index) {
-    std::string problem = UnexpectedDifference(after[index], before[index], own);
-    if (!problem.empty()) {
-      throw Failure(ExitCode::HostNotReady,
-                    "the service '" + before[index].service + "' would not be what it was without the module")
-          .Detail("reason", problem)
-          .Try("velmorctl pam restore, if nothing else was changed since");
-    }
+  RequireAsBefore(ResolveAll(current), ResolveAll(bare), own);
+  RequireModelAgrees(before, after, root, own);
+  std::vector<std::string> notes = NotesOnUnreadable(before);
+  if (module) {
+    std::vector<std::string> remaining = NotesOnRemaining(after, module->name);
+    notes.insert(notes.end(), remaining.begin(), remaining.end());
   }
-  return {std::move(bare), module ? NotesOnRemaining(after, module->name) : std::vector<std::string>(), {}};
+  return {std::move(bare), std::move(notes), {}};
 }
 
 }  // namespace velmorctl::pam

@@ -1,5 +1,7 @@
 #include "pam_edit/model_agreement.h"
 
+#include <algorithm>
+#include <iterator>
 #include <optional>
 #include <sstream>
 
@@ -39,6 +41,7 @@ bool IsOwn(const PAMEntry& entry, const OwnModules& own) {
   return primer || guard || own.contains(entry.module());
 }
 
+/// Whether `with` is `without` and own entries between its entries.
 bool StacksAgree(const PAMStack& without, const PAMStack& with, const OwnModules& own) {
   auto next = without.begin();
   for (const PAMEntry& entry : with) {
@@ -51,23 +54,24 @@ bool StacksAgree(const PAMStack& without, const PAMStack& with, const OwnModules
   return next == without.end();
 }
 
+bool PoliciesAgree(PAMPolicy& without, PAMPolicy& with, const OwnModules& own) {
+  return std::all_of(std::begin(facilities), std::end(facilities), [&](PAMFacility::Facility facility) {
+    return StacksAgree(without[facility], with[facility], own);
+  });
+}
+
 }  // namespace
 
-bool ModelAgrees(const std::string& without, const std::string& with, const OwnModules& own) {
-  std::optional<PAMPolicy> before = Read(without);
-  if (!before) {
-    return true;
-  }
-  std::optional<PAMPolicy> after = Read(with);
-  if (!after) {
-    return false;
-  }
-  for (PAMFacility::Facility facility : facilities) {
-    if (!StacksAgree((*before)[facility], (*after)[facility], own)) {
-      return false;
-    }
-  }
-  return true;
+bool ModelSeesOwnAdded(const std::string& before, const std::string& after, const OwnModules& own) {
+  std::optional<PAMPolicy> was = Read(before);
+  std::optional<PAMPolicy> is = Read(after);
+  return !was || (is && PoliciesAgree(*was, *is, own));
+}
+
+bool ModelSeesOwnRemoved(const std::string& before, const std::string& after, const OwnModules& own) {
+  std::optional<PAMPolicy> was = Read(before);
+  std::optional<PAMPolicy> is = Read(after);
+  return !was || (is && PoliciesAgree(*is, *was, own));
 }
 
 }  // namespace velmorctl::pam
