@@ -21,7 +21,7 @@ struct Call {
 /// "domain", "organizationalUnit" (may be empty), "user", and the password. Returns what was done, in a line.
 std::string Join(const Call& call);
 
-/// "dnsDomain", "netbiosDomain", "hostName", "accountName", and the join blob. Uses no network.
+/// "dnsDomain", "netbiosDomain", "accountName", and the join blob. Uses no network.
 std::string JoinWithMachineAccount(const Call& call);
 
 /// "user" and the password, or neither for a leave that needs no account and no network.

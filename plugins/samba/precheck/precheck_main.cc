@@ -8,7 +8,7 @@
 //   "organizationalUnit": for inspect; may be empty
 //   "computerDnsName": for remove; the account is deleted only when it has this DNS host name, or none
 //
-// An answer has "step", where it stopped: "locate", "password", "clock" or "account". An inspect with status
+// An answer has "step", where it stopped: "connect", "password", "clock" or "account". An inspect with status
 // 0 adds "controller", "netbiosDomain", "organizationalUnitDn", "accountDn" and "accountHostName".
 #include <sys/prctl.h>
 
