@@ -8,6 +8,7 @@
 
 #include "program.h"
 #include "support/files.h"
+#include "tool.h"
 
 namespace velmorctltest {
 
@@ -201,6 +202,31 @@ TEST(ManualTest, EveryCommandIsCompletedByTheShell) {
   for (const std::vector<std::string>& command : AllCommands()) {
     const std::regex word("[ '\"(=]" + command.back() + "[ '\")]");
     EXPECT_TRUE(std::regex_search(completion, word)) << command[0] << " " << command.back();
+  }
+}
+
+/// The long options that the shell offers behind a command.
+std::set<std::string> OptionsOfferedBehind(const std::vector<std::string>& command) {
+  std::vector<std::string> arguments = {
+      "bash", "-c",
+      "source \"$0\"; COMP_WORDS=(velmorctl \"$@\" --); COMP_CWORD=$(($# + 1)); _velmorctl; "
+      "printf '%s\\n' \"${COMPREPLY[@]}\"",
+      SOURCES + "/tools/velmorctl/velmorctl.bash"};
+  arguments.insert(arguments.end(), command.begin(), command.end());
+  std::set<std::string> options;
+  for (const std::string& line : Lines(RunTool(arguments).output)) {
+    if (line.starts_with("--")) {
+      options.insert(line.substr(2));
+    }
+  }
+  return options;
+}
+
+TEST(ManualTest, TheShellOffersTheOptionsThatACommandHas) {
+  for (const std::vector<std::string>& command : AllCommands()) {
+    std::set<std::string> options = OptionsOf(command);
+    options.erase("help");
+    EXPECT_EQ(OptionsOfferedBehind(command), options) << command[0] << " " << command.back();
   }
 }
 
