@@ -20,6 +20,7 @@ extern "C" {
 #include "helper/undo.h"
 #include "support/files.h"
 #include "support/interpose.h"
+#include "systemctl_script.h"
 
 namespace sambaprovider {
 namespace {
@@ -162,6 +163,27 @@ TEST_F(RecoverTest, ALeaveThatHadRemovedNothingYetIsForgotten) {
 TEST_F(RecoverTest, AChangeOfControllersOnAnUnjoinedHostIsOver) {
   SaveJournal({Journal::Operation::kPrefer, "", "", "", false});
   RunRecover();
+  EXPECT_FALSE(testsupport::Exists(paths::kJournal));
+}
+
+TEST_F(RecoverTest, AChangeOfControllersSparesAnAdministratorsSmbConf) {
+  SaveJoined();
+  WriteSmbConf("ours");
+  testsupport::WriteFile(paths::kSmbConf, "theirs");
+  SaveJournal({Journal::Operation::kPrefer, "corp.example", "CORP", "SANDBOX", false});
+  ReplaceSystemctl("[ $2 != start ]");
+  RunRecover();
+  EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "theirs");
+  EXPECT_FALSE(testsupport::Exists(paths::kJournal));
+}
+
+TEST_F(RecoverTest, AChangeOfControllersThatWinbinddDoesNotFollowIsOver) {
+  SaveJoined();
+  WriteSmbConf("ours");
+  SaveJournal({Journal::Operation::kPrefer, "corp.example", "CORP", "SANDBOX", false});
+  ReplaceSystemctl("[ $2 != start ]");
+  RunRecover();
+  EXPECT_NE(testsupport::ReadFile(paths::kSmbConf), "ours");
   EXPECT_FALSE(testsupport::Exists(paths::kJournal));
 }
 

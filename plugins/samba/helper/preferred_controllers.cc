@@ -11,6 +11,7 @@ namespace sambaprovider {
 
 void ApplyPreferredControllers(const State& state, const Settings& settings) {
   if (!state.joined) return;
+  RequireSmbConfIsReplaceable();
   winbind_service::Stop();
   WriteSmbConf(FormatSmbConf(state, settings, KeytabUse::kKept));
   winbind_service::FlushCache();

@@ -7,9 +7,10 @@
 
 namespace sambaprovider {
 
-/// Writes smb.conf for the state, which must be joined, and has winbindd begin anew with it. winbindd
-/// remembers the controller that it used last and ignores the setting unless its cache is emptied while it is
-/// stopped. Throws Failure.
+/// Writes smb.conf for the state and has winbindd begin anew with it; nothing is to do for a host that has
+/// joined no domain. winbindd remembers the controller that it used last and ignores the setting unless its
+/// cache is emptied while it is stopped. Throws Failure: kHostConfigurationInTheWay when smb.conf is an
+/// administrator's, which is left as it is.
 void ApplyPreferredControllers(const State& state, const Settings& settings);
 
 }  // namespace sambaprovider

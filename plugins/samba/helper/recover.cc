@@ -30,6 +30,17 @@ void RecoverLeave(const Call& call, const Journal& journal) {
   }
 }
 
+// The controllers are remembered, and the next change of them applies them. What stands in the way of that
+// now must not keep the host from a leave, or from the change that mends it.
+void RecoverPreference(const Call& call) {
+  try {
+    ApplyPreferredControllers(LoadState(), call.settings);
+  } catch (const Failure& failure) {
+    call.log.Note("restore", failure.what());
+  }
+  RemoveJournal();
+}
+
 }  // namespace
 
 std::string Recover(const Call& call) {
@@ -44,8 +55,7 @@ std::string Recover(const Call& call) {
         RecoverLeave(call, *journal);
         break;
       case Journal::Operation::kPrefer:
-        ApplyPreferredControllers(LoadState(), call.settings);
-        RemoveJournal();
+        RecoverPreference(call);
         break;
     }
     return "done";
