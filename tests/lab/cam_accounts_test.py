@@ -14,6 +14,37 @@ server role = member server
 disable netbios = yes
 """
 
+# The helper, which sees another program in the place of the one that makes accounts; that one is FOLDER/real.
+HELPER_WITH_OTHER_PROVISION = """#!/bin/sh
+touch FOLDER/real
+exec unshare --map-root-user --mount sh -ec '
+  mount --bind /usr/libexec/velmor/velmor-camd-provision FOLDER/real
+  mount --bind FOLDER/provision /usr/libexec/velmor/velmor-camd-provision
+  exec /usr/libexec/velmor/velmor-camd-helper'
+"""
+# Makes the account and cuts the helper's connection to the controller before the answer.
+CUTTING_PROVISION = """#!/usr/bin/python3
+import ctypes, json, os, socket, subprocess, sys
+PIDFD_GETFD = 438
+line = sys.stdin.buffer.readline()
+secret = sys.stdin.buffer.read(json.loads(line)["secretSize"])
+answer = subprocess.run(["FOLDER/real"], input=line + secret, stdout=subprocess.PIPE).stdout
+helper = os.pidfd_open(os.getppid())
+for number in map(int, os.listdir(f"/proc/{os.getppid()}/fd")):
+    descriptor = ctypes.CDLL(None).syscall(PIDFD_GETFD, helper, number, 0)
+    try:
+        connection = socket.socket(fileno=descriptor)
+    except OSError:
+        continue
+    if connection.family == socket.AF_INET:
+        connection.shutdown(socket.SHUT_RDWR)
+sys.stdout.buffer.write(answer)
+"""
+# Says that it made an account.
+LYING_PROVISION = """#!/bin/sh
+printf '{"status": 0, "text": "", "secretSize": 4}\\nblob'
+"""
+
 
 class CamAccountsTest(LabTest):
     """A service, and a host that asks it. Names of other hosts begin with this host's, so that tests that run beside
@@ -44,20 +75,16 @@ class CamAccountsTest(LabTest):
         code, body = self.create(service, name, container)
         return code, body.get("status", 0)
 
-    def sql(self, service, statement):
-        """Runs a statement on the service's ledger; returns its rows."""
-        program = ("import json, sqlite3, sys; database = sqlite3.connect(sys.argv[1], timeout=10); "
-                   "print(json.dumps(database.execute(sys.argv[2]).fetchall())); database.commit()")
-        return json.loads(service.must("/usr/bin/python3", "-c", program, f"{service.folder}/ledger.db", statement))
-
     def ledger(self, service):
-        return [tuple(row) for row in self.sql(service, "SELECT computer, state FROM accounts ORDER BY computer, id")]
+        program = ("import json, sqlite3, sys; database = sqlite3.connect(sys.argv[1], timeout=10); print(json.dumps("
+                   "database.execute('SELECT computer, state FROM accounts ORDER BY computer, id').fetchall()))")
+        rows = json.loads(service.must("/usr/bin/python3", "-c", program, f"{service.folder}/ledger.db"))
+        return [tuple(row) for row in rows]
 
     def look_for_unused_ones(self, service):
-        """Makes all accounts older, and has the service look; returns the ledger when it has."""
+        """Has the service look when two hours have gone by; returns the ledger when it has."""
         service.stop()
-        self.sql(service, "UPDATE accounts SET requested = requested - 7200")
-        service.start()
+        service.start(ahead="2h")
         deadline = time.monotonic() + 60
         while '"unused account"' not in service.audit():
             assert time.monotonic() < deadline, "the service did not look at the account"
@@ -221,6 +248,33 @@ class CamUnknownOutcomeTest(CamAccountsTest):
         self.assertEqual(self.look_for_unused_ones(service),
                          [(self.host.account, "interrupted"), (self.host.account, "kept")])
         self.host.must("net", "ads", "testjoin", "-P")
+
+
+class CamLostSightTest(CamAccountsTest):
+    """An account that was made, so they say, and cannot be looked at."""
+
+    def lost(self, name, provision):
+        """A service with another program that makes accounts, which has been asked for one."""
+        service = self.service()
+        service.stop()
+        service.write("provision", provision.replace("FOLDER", service.folder), "700")
+        service.write("helper", HELPER_WITH_OTHER_PROVISION.replace("FOLDER", service.folder), "700")
+        service.write("camd.conf", service.configuration(
+            {"directory": {"helper": f"{service.folder}/helper", "remove-unused-after-hours": 1}}))
+        service.start()
+        self.assertEqual(self.outcome(service, name), (500, 1067))
+        self.assertEqual(self.ledger(service), [(name.upper(), "interrupted")])
+        return service
+
+    def testAccountThatCannotBeReadIsRemovedInItsTime(self):
+        name = self.name("n1")
+        service = self.lost(name, CUTTING_PROVISION)
+        self.assertIsNotNone(self.directory.computer(name.upper()))
+        self.assertEqual(self.look_for_unused_ones(service), [(name.upper(), "removed")])
+        self.assertIsNone(self.directory.computer(name.upper()))
+
+    def testAccountThatIsNotThereIsLookedForLater(self):
+        self.lost(self.name("n1"), LYING_PROVISION)
 
 
 class CamTakeOverTest(CamAccountsTest):

@@ -181,6 +181,17 @@ bool MayTakeOver(const Message& request, Connection& connection) {
   return takeOver == "own-unused" && request.Number("createdAfter") != 0 && IsUnused(request, connection);
 }
 
+// What Provision made. When it cannot be seen the service must not take the creation for one that failed.
+ComputerAccount AccountMade(Connection& connection, const std::string& computer) {
+  try {
+    if (const auto made = connection.directory.FindComputer(connection.root, computer)) return *made;
+  } catch (const Failure& failure) {
+    throw Failure(kHelperDied,
+                  "the account " + computer + " was made, and cannot be read: " + failure.what());
+  }
+  throw Failure(kHelperDied, "the account " + computer + " was made, and is not there");
+}
+
 Message Create(const Message& request) {
   const std::string computer = request.Text("computer");
   Connection connection = Connect(request);
@@ -190,15 +201,14 @@ Message Create(const Message& request) {
     throw Failure(kAccountExists, "there is an account " + computer + " already");
   }
   Message answer = Provision(request, connection, container, exists);
-  const auto made = connection.directory.FindComputer(connection.root, computer);
-  if (!made) throw Failure(kInternalError, "the account " + computer + " was made, and is not there");
+  const ComputerAccount made = AccountMade(connection, computer);
   answer.fields = {{"accountName", computer + "$"},
-                   {"dn", made->dn},
-                   {"sid", made->sid},
+                   {"dn", made.dn},
+                   {"sid", made.sid},
                    {"recordedBy", connection.root.controller},
-                   {"passwordSet", made->passwordSet},
-                   {"lastLogon", made->lastLogon},
-                   {"logonCount", made->logonCount}};
+                   {"passwordSet", made.passwordSet},
+                   {"lastLogon", made.lastLogon},
+                   {"logonCount", made.logonCount}};
   return answer;
 }
 
