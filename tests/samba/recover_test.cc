@@ -72,7 +72,7 @@ TEST_F(RecoverTest, WithoutAJournalNothingHappens) {
 
 TEST_F(RecoverTest, AnInterruptedJoinIsTakenBack) {
   before_join::PutAside();
-  SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", true});
+  SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", "dc1.corp.example"});
   // Killed between remembering what it writes to smb.conf and writing it.
   testsupport::WriteFile(paths::kWrittenSmbConf, "ours");
   testsupport::RemoveFile(paths::kSmbConf);
@@ -100,7 +100,7 @@ class KilledWritingTest : public RecoverTest, public testing::WithParamInterface
 
 TEST_P(KilledWritingTest, TheSmbConfFromBeforeTheJoinComesBack) {
   before_join::PutAside();
-  SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", false});
+  SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", ""});
   WriteSmbConf("[global]\n");
   WriteUntilKilled("[global]\n  workgroup = CORP\n", GetParam());
   RunRecover();
@@ -112,7 +112,7 @@ INSTANTIATE_TEST_SUITE_P(AfterEachFile, KilledWritingTest, testing::Values(0, 1,
 
 TEST_F(RecoverTest, AJoinThatIsTakenBackIsForgotten) {
   before_join::PutAside();
-  const Journal journal{Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", false};
+  const Journal journal{Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", ""};
   SaveJournal(journal);
   // Saving the state can fail after the file has got its new content.
   SaveJoined();
@@ -123,9 +123,23 @@ TEST_F(RecoverTest, AJoinThatIsTakenBackIsForgotten) {
   EXPECT_FALSE(testsupport::Exists(paths::kJournal));
 }
 
+TEST_F(RecoverTest, ANewAccountIsRemovedAtTheControllerWhereItWasMade) {
+  const std::string notes = "/run/request";
+  testsupport::MakeFolders(testsupport::PLUGIN_FOLDER);
+  testsupport::WriteFile(paths::kPrecheck, "#!/bin/sh\nread line; echo \"$line\" > " + notes +
+                                               "; echo '{\"status\":0,\"text\":\"removed\"}'\n");
+  testsupport::SetMode(paths::kPrecheck, 0755);
+  const velmor::Secret password("Passw0rd");
+  const UndoAccount account{"alice", password};
+  before_join::PutAside();
+  UndoJoin(log_, {Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", "dc3.corp.example"},
+           &account);
+  EXPECT_NE(testsupport::ReadFile(notes).find("\"controllers\":[\"dc3.corp.example\""), std::string::npos);
+}
+
 TEST_F(RecoverTest, AJoinThatHadRememberedItsDomainIsKept) {
   before_join::PutAside();
-  SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", true});
+  SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", "dc1.corp.example"});
   SaveJoined();
   RunRecover();
   EXPECT_TRUE(LoadState().joined);
@@ -138,7 +152,7 @@ TEST_F(RecoverTest, ALeaveWhoseSecretsAreGoneIsFinished) {
   testsupport::WriteFile(paths::kWrittenSmbConf, "ours");
   testsupport::WriteFile(paths::kSmbConf, "ours");
   SaveJoined();
-  SaveJournal({Journal::Operation::kLeave, "corp.example", "CORP", "SANDBOX", false});
+  SaveJournal({Journal::Operation::kLeave, "corp.example", "CORP", "SANDBOX", ""});
   RunRecover();
   EXPECT_FALSE(LoadState().joined);
   EXPECT_EQ(LoadState().dnsDomain, "");
@@ -153,7 +167,7 @@ TEST_F(RecoverTest, ALeaveThatHadRemovedNothingYetIsForgotten) {
   testsupport::WriteFile(paths::kSmbConf, "ours");
   SaveJoined();
   StoreMachinePassword();
-  SaveJournal({Journal::Operation::kLeave, "corp.example", "CORP", "SANDBOX", false});
+  SaveJournal({Journal::Operation::kLeave, "corp.example", "CORP", "SANDBOX", ""});
   RunRecover();
   EXPECT_TRUE(LoadState().joined);
   EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "ours");
@@ -161,7 +175,7 @@ TEST_F(RecoverTest, ALeaveThatHadRemovedNothingYetIsForgotten) {
 }
 
 TEST_F(RecoverTest, AChangeOfControllersOnAnUnjoinedHostIsOver) {
-  SaveJournal({Journal::Operation::kPrefer, "", "", "", false});
+  SaveJournal({Journal::Operation::kPrefer, "", "", "", ""});
   RunRecover();
   EXPECT_FALSE(testsupport::Exists(paths::kJournal));
 }
@@ -170,7 +184,7 @@ TEST_F(RecoverTest, AChangeOfControllersSparesAnAdministratorsSmbConf) {
   SaveJoined();
   WriteSmbConf("ours");
   testsupport::WriteFile(paths::kSmbConf, "theirs");
-  SaveJournal({Journal::Operation::kPrefer, "corp.example", "CORP", "SANDBOX", false});
+  SaveJournal({Journal::Operation::kPrefer, "corp.example", "CORP", "SANDBOX", ""});
   ReplaceSystemctl("[ $2 != start ]");
   RunRecover();
   EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "theirs");
@@ -180,7 +194,7 @@ TEST_F(RecoverTest, AChangeOfControllersSparesAnAdministratorsSmbConf) {
 TEST_F(RecoverTest, AChangeOfControllersThatWinbinddDoesNotFollowIsOver) {
   SaveJoined();
   WriteSmbConf("ours");
-  SaveJournal({Journal::Operation::kPrefer, "corp.example", "CORP", "SANDBOX", false});
+  SaveJournal({Journal::Operation::kPrefer, "corp.example", "CORP", "SANDBOX", ""});
   ReplaceSystemctl("[ $2 != start ]");
   RunRecover();
   EXPECT_NE(testsupport::ReadFile(paths::kSmbConf), "ours");
@@ -193,14 +207,14 @@ TEST_F(RecoverTest, AJournalThatIsNotUnderstoodIsNone) {
 }
 
 TEST_F(RecoverTest, TheJournalComesBackAsItWasSaved) {
-  SaveJournal({Journal::Operation::kLeave, "corp.example", "CORP", "SANDBOX", true});
+  SaveJournal({Journal::Operation::kLeave, "corp.example", "CORP", "SANDBOX", "dc1.corp.example"});
   const auto journal = LoadJournal();
   ASSERT_TRUE(journal.has_value());
   EXPECT_EQ(journal->operation, Journal::Operation::kLeave);
   EXPECT_EQ(journal->dnsDomain, "corp.example");
   EXPECT_EQ(journal->netbiosDomain, "CORP");
   EXPECT_EQ(journal->computer, "SANDBOX");
-  EXPECT_TRUE(journal->accountIsNew);
+  EXPECT_EQ(journal->accountMadeAt, "dc1.corp.example");
 }
 
 }  // namespace

@@ -159,7 +159,7 @@ std::string Join(const Call& call) {
   // Another controller may not know the new account yet.
   logon.controllers = {found.controller};
   const Journal journal{Journal::Operation::kJoin, domain, found.netbiosDomain, computer,
-                        found.accountDn.empty()};
+                        found.accountDn.empty() ? found.controller : ""};
   Membership membership(call, MemberState(domain, found.netbiosDomain, computer), journal);
   membership.Prepare();
   try {
@@ -199,7 +199,7 @@ std::string JoinWithMachineAccount(const Call& call) {
     }
     return computer + " may join";
   });
-  const Journal journal{Journal::Operation::kJoin, domain, netbiosDomain, computer, false};
+  const Journal journal{Journal::Operation::kJoin, domain, netbiosDomain, computer, ""};
   Membership membership(call, MemberState(domain, netbiosDomain, computer), journal);
   membership.Prepare();
   try {

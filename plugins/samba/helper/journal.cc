@@ -21,7 +21,7 @@ std::optional<Journal> LoadJournal() {
     json.at("dnsDomain").get_to(journal.dnsDomain);
     json.at("netbiosDomain").get_to(journal.netbiosDomain);
     json.at("computer").get_to(journal.computer);
-    json.at("accountIsNew").get_to(journal.accountIsNew);
+    json.at("accountMadeAt").get_to(journal.accountMadeAt);
     return journal;
   } catch (const nlohmann::json::exception&) {
     return std::nullopt;
@@ -33,7 +33,7 @@ void SaveJournal(const Journal& journal) {
                                {"dnsDomain", journal.dnsDomain},
                                {"netbiosDomain", journal.netbiosDomain},
                                {"computer", journal.computer},
-                               {"accountIsNew", journal.accountIsNew}};
+                               {"accountMadeAt", journal.accountMadeAt}};
   ReplaceFile(paths::kJournal, json.dump(2) + "\n", 0600);
 }
 

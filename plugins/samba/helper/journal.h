@@ -13,8 +13,9 @@ struct Journal {
   std::string dnsDomain;
   std::string netbiosDomain;
   std::string computer;
-  /// Whether a join may have made the account, so that undoing it removes the account again.
-  bool accountIsNew = false;
+  /// The controller where a join makes the account, so that undoing it removes the account there again; empty
+  /// when it makes none.
+  std::string accountMadeAt;
 };
 
 /// Nothing when no operation was interrupted; also for a journal that cannot be understood, which can only be

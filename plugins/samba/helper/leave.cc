@@ -64,7 +64,7 @@ std::string Leave(const Call& call) {
   });
   const bool disableAccount = withAccount && CheckCredentials(call, state, user);
 
-  SaveJournal({Journal::Operation::kLeave, state.dnsDomain, state.netbiosDomain, state.hostName, false});
+  SaveJournal({Journal::Operation::kLeave, state.dnsDomain, state.netbiosDomain, state.hostName, ""});
   if (disableAccount) {
     UnjoinWithAccount(call, user);
   } else {

@@ -29,7 +29,7 @@ std::string PreferControllers(const Call& call) {
     if (state.joined) RequireSmbConfIsReplaceable();
     return "fine";
   });
-  SaveJournal({Journal::Operation::kPrefer, state.dnsDomain, state.netbiosDomain, state.hostName, false});
+  SaveJournal({Journal::Operation::kPrefer, state.dnsDomain, state.netbiosDomain, state.hostName, ""});
   call.log.Run("state", "remembering the preferred controllers", [&] {
     SaveState(state);
     return "remembered";

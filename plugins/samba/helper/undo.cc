@@ -1,5 +1,8 @@
 #include "helper/undo.h"
 
+#include <string>
+#include <vector>
+
 #include "common/names.h"
 #include "common/smb_conf.h"
 #include "common/state.h"
@@ -54,6 +57,18 @@ std::string ForgetJoin() {
   return "the domain is forgotten";
 }
 
+// Only the one where it was made is sure to know the account; the others may, should that one have gone.
+std::vector<std::string> ControllersOfAccount(const Journal& journal) {
+  std::vector<std::string> controllers = {journal.accountMadeAt};
+  try {
+    const std::vector<std::string> others = LocateControllers(journal.dnsDomain);
+    controllers.insert(controllers.end(), others.begin(), others.end());
+  } catch (const Failure&) {
+    // The first one is reached without the SRV records.
+  }
+  return controllers;
+}
+
 void RestoreService() {
   winbind_service::Stop();
   if (before_join::ServiceWasRunning()) winbind_service::Start();
@@ -67,9 +82,9 @@ void UndoJoin(const AttemptLog& log, const Journal& journal, const UndoAccount* 
   const bool forgotten = Try(log, ForgetJoin);
   // libnetapi finds the secrets by the domain in smb.conf, so this comes before smb.conf is given back.
   if (OwnerOfPresentSmbConf() == SmbConfOwner::kProvider) Try(log, RemoveSecrets);
-  if (journal.accountIsNew && account != nullptr) {
+  if (!journal.accountMadeAt.empty() && account != nullptr) {
     Try(log, [&] {
-      return RemoveAccount({journal.dnsDomain, LocateControllers(journal.dnsDomain), account->user,
+      return RemoveAccount({journal.dnsDomain, ControllersOfAccount(journal), account->user,
                             account->password, journal.computer});
     });
   }
