@@ -10,6 +10,7 @@ namespace velmorctltest {
 namespace {
 
 using velmorctl::pam::FileReading;
+using velmorctl::pam::ReadingProblem;
 using velmorctl::pam::ReadWrittenPolicies;
 using velmorctl::pam::WrittenPolicies;
 
@@ -52,9 +53,11 @@ TEST(WrittenPoliciesTest, HoldEachFileOfACircleOnce) {
 TEST(WrittenPoliciesTest, NameFilesThatCannotBeReadAndNoMissingOnes) {
   const auto read = [](const std::string& name) -> FileReading {
     if (name == SERVICE) {
-      return {"@include bad\n@include missing\n", "", false};
+      return {"@include bad\n@include missing\n", std::nullopt};
     }
-    return name == "/etc/pam.d/bad" ? FileReading{std::nullopt, "it is no text file", false} : FileReading();
+    return name == "/etc/pam.d/bad"
+               ? FileReading{std::nullopt, ReadingProblem{"it is no text file", "put one there", 0, ""}}
+               : FileReading();
   };
   const WrittenPolicies written = ReadWrittenPolicies({SERVICE}, read);
   EXPECT_EQ(written.contents.size(), 1U);

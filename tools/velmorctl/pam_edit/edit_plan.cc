@@ -44,19 +44,25 @@ std::set<std::string> FilesOf(const Policy& policy) {
   return files;
 }
 
-/// What the services are written in: libpam may refuse a policy, or pass over a file, with own lines in it.
-WrittenPolicies ReadWritten(const Draft& draft, const std::vector<std::string>& services) {
+/// What a service is written in.
+std::vector<std::string> FilesOfService(const std::string& service) {
   std::vector<std::string> files;
-  for (const std::string& service : services) {
-    for (const char* folder : policyFolders) {
-      files.push_back(std::string(folder) + "/" + service);
+  for (const char* folder : policyFolders) {
+    files.push_back(std::string(folder) + "/" + service);
+  }
+  return files;
+}
+
+/// libpam may refuse a policy, or never come to a file, with own lines in it.
+WrittenPolicies ReadAllWritten(const Draft& draft) {
+  PolicyRoot root(draft.Root());
+  std::vector<std::string> files = root.FilesWithCapitals();
+  for (const std::string& service : root.Services()) {
+    for (std::string& file : FilesOfService(service)) {
+      files.push_back(std::move(file));
     }
   }
   return ReadWrittenPolicies(std::move(files), draft.Reader());
-}
-
-WrittenPolicies ReadAllWritten(const Draft& draft) {
-  return ReadWritten(draft, PolicyRoot(draft.Root()).Services());
 }
 
 /// Takes out what was put in before, whatever libpam makes of the policies now.
@@ -307,7 +313,8 @@ class EnablePlanner {
   void RequireKept(const Draft& next, const Refusal& refusal) const {
     bool profileGoes = !ModulesOfProfile(current_).empty() && ModulesOfProfile(next).empty();
     std::set<std::string> files = FilesOf(PolicyOf(refusal.service));
-    for (const auto& [file, content] : ReadWritten(current_, {refusal.service}).contents) {
+    WrittenPolicies written = ReadWrittenPolicies(FilesOfService(refusal.service), current_.Reader());
+    for (const auto& [file, content] : written.contents) {
       files.insert(file);
     }
     for (const std::string& file : files) {

@@ -35,8 +35,8 @@ WrittenPolicies ReadWrittenPolicies(std::vector<std::string> files, const FileRe
       std::vector<std::string> includes = IncludesIn(*reading.content);
       files.insert(files.end(), includes.begin(), includes.end());
       written.contents.emplace(std::move(file), std::move(*reading.content));
-    } else if (!reading.problem.empty()) {
-      written.unreadable.emplace(std::move(file), reading.problem);
+    } else if (reading.problem) {
+      written.unreadable.emplace(std::move(file), reading.problem->reason);
     }
   }
   return written;
