@@ -23,6 +23,7 @@ CertificateCheck::CertificateCheck(std::string server, std::string thumbprint, s
     : server_(std::move(server)), thumbprint_(std::move(thumbprint)), sha256_(sha256) {}
 
 void CertificateCheck::Install(SSL_CTX* context) {
+  accepted_ = false;  // each connection has to show its own
   SSL_CTX_set_verify(context, SSL_VERIFY_PEER, nullptr);
   SSL_CTX_set_cert_verify_callback(context, Verify, this);
 }

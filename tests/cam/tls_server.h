@@ -30,6 +30,8 @@ class Connection {
   bool Send(const std::string& bytes);
   /// Waits until the client hangs up.
   void AwaitEnd();
+  /// The server shows its later clients no certificate, as far as they agree.
+  void HideCertificate();
   int Descriptor() const { return descriptor_; }
 
  private:

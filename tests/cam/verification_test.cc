@@ -154,12 +154,13 @@ TEST(CamVerificationTest, NothingIsCheckedWithVerificationOff) {
   EXPECT_EQ(RecordedLog(), std::vector<LogLine>{});
 }
 
-/// Lets every program of the sandbox speak TLS without certificates, and nothing else.
-void AllowTlsWithoutCertificates() {
+/// Lets every program of the sandbox speak TLS with these ciphers, of which some need no certificate.
+void AllowTlsWithoutCertificates(const std::string& ciphers = "aNULL") {
   testsupport::WriteFile(
       "/etc/openssl-anonymous.cnf",
       "openssl_conf = settings\n[settings]\nssl_conf = tls\n[tls]\nsystem_default = everybody\n"
-      "[everybody]\nCipherString = aNULL:@SECLEVEL=0\nMaxProtocol = TLSv1.2\n");
+      "[everybody]\nCipherString = " +
+          ciphers + ":@SECLEVEL=0\nMaxProtocol = TLSv1.2\n");
   setenv("OPENSSL_CONF", "/etc/openssl-anonymous.cnf", 1);
 }
 
@@ -171,7 +172,20 @@ TEST(CamVerificationTest, ServerWithoutACertificateGetsNothing) {
             (std::vector<LogLine>{{LOG_ERR, "CAM server 127.0.0.1: it showed no certificate"}}));
 }
 
-/// The server of the test above does answer those who want no certificate.
+TEST(CamVerificationTest, ServerThatShowsACertificateAtFirstOnlyGetsNothingMore) {
+  AllowTlsWithoutCertificates("ALL:+aNULL");
+  const Identity identity;
+  TlsServer server(identity, [](Connection& connection) {
+    connection.HideCertificate();
+    connection.ReadRequest();
+    connection.Send(HttpAnswer("503 Service Unavailable", R"({"status": 170, "text": "too many requests"})"));
+  });
+  WriteSettings(server.Port());
+  EXPECT_EQ(Plugin().Create("host2", identity.Sha1()).status, WRONG_CERTIFICATE);
+  EXPECT_EQ(server.RequestsOf(2).size(), 1U);
+}
+
+/// The servers of the tests above do answer those who want no certificate.
 TEST(CamVerificationTest, ServerWithoutACertificateIsReal) {
   AllowTlsWithoutCertificates();
   EXPECT_EQ(CreateAt(Identity(), "", "", TLS1_2_VERSION), ACCEPTED);
