@@ -489,7 +489,7 @@ TEST_F(NameServiceTest, ShowsNoControlCharactersOfTheRoot) {
   MakeFolders(root + "/etc");
   WriteFile(root + "/etc/nsswitch.conf", "passwd: files nosuch\n");
   ExpectIn(Velmorctl({"nss", "add", "passwd", "winbind", "--root", root}).output,
-           " --root " + scratch.Path() + "a??b\n");
+           " --root '" + scratch.Path() + "a??b'\n");
 }
 
 TEST_F(NameServiceTest, NamesTheRootInARemedy) {

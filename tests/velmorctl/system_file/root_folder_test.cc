@@ -6,6 +6,7 @@
 
 #include "failure_of.h"
 #include "support/files.h"
+#include "tool.h"
 
 namespace velmorctltest {
 
@@ -72,6 +73,16 @@ TEST_F(RootFolderTest, GoesUpFromWhereALinkHasLed) {
   MakeFolders(folder_ + "/srv/a/b");
   Link("/srv/a/b", "/etc/folder");
   EXPECT_EQ(root_.Resolve("/etc/folder/../file"), folder_ + "/srv/a/file");
+}
+
+TEST_F(RootFolderTest, IsAnOptionThatAShellReadsAsOneWord) {
+  EXPECT_EQ(RootFolder("/").Option(), "");
+  EXPECT_EQ(root_.Option(), " --root " + folder_);
+  for (const char* name : {"/a root", "/it's", "/a$HOME", "/a\"b", "/~*", "/a;b"}) {
+    MakeFolders(folder_ + name);
+    const std::string script = "printf %s" + RootFolder(folder_ + name).Option();
+    EXPECT_EQ(RunTool({"sh", "-c", script}).output, "--root" + folder_ + name);
+  }
 }
 
 TEST_F(RootFolderTest, ReportsACircleOfLinks) {

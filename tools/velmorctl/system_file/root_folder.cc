@@ -3,6 +3,7 @@
 #include <cerrno>
 #include <deque>
 #include <filesystem>
+#include <string_view>
 #include <system_error>
 #include <vector>
 
@@ -34,6 +35,20 @@ std::string LinkTarget(const std::string& path) {
   return error ? std::string() : target.string();
 }
 
+/// The text as one word of a shell's command line.
+std::string ShellWord(const std::string& text) {
+  constexpr std::string_view plain =
+      "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789/._-+,:@%=";
+  if (text.find_first_not_of(plain) == std::string::npos) {
+    return text;
+  }
+  std::string word = "'";
+  for (const char character : text) {
+    word += character == '\'' ? std::string("'\\''") : std::string(1, character);
+  }
+  return word + "'";
+}
+
 }  // namespace
 
 void AddRootOption(CLI::App& command, std::string& root) {
@@ -58,7 +73,7 @@ std::string RootFolder::Shown(const std::string& name) const {
 }
 
 std::string RootFolder::Option() const {
-  return IsHost() ? "" : " --root " + folder_;
+  return IsHost() ? "" : " --root " + ShellWord(folder_);
 }
 
 std::string RootFolder::Resolve(const std::string& name) const {
