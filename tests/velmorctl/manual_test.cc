@@ -197,6 +197,16 @@ TEST(ManualTest, EveryOptionIsInThePage) {
   }
 }
 
+TEST(ManualTest, RestoreWithoutAnIdMeansTheSameInThePageAndInTheHelp) {
+  const std::string page = Page("velmorctl.8");
+  for (const std::string kind : {"nss", "pam"}) {
+    const std::string help = Velmorctl({kind, "restore", "--help"}).output;
+    EXPECT_NE(help.find("without it the newest that no restore has left"), std::string::npos) << help;
+    const std::string entry = page.substr(page.find(".It Cm " + kind + " restore Op Ar ID\n"), 300);
+    EXPECT_NE(entry.find("before the newest one that is not a restore itself"), std::string::npos) << entry;
+  }
+}
+
 TEST(ManualTest, EveryCommandIsCompletedByTheShell) {
   const std::string completion = testsupport::ReadFile(SOURCES + "/tools/velmorctl/velmorctl.bash");
   for (const std::vector<std::string>& command : AllCommands()) {

@@ -188,7 +188,7 @@ void AddEditingCommands(CLI::App& nss, Invocation& invocation, const std::shared
   remove->add_option("DATABASE", options->database, "For example passwd")->required();
   remove->add_option("SERVICE", options->service, "For example winbind")->required();
   CLI::App* restore = nss.add_subcommand("restore", "Go back to a backup");
-  restore->add_option("ID", options->backup, "The backup; without it the newest that no restore has left");
+  AddBackupArgument(*restore, options->backup);
   CLI::Option* list = restore->add_flag("--list", options->list, "List the backups and restore nothing");
   restore->add_flag("--json", options->json, "Print the list as a JSON document")->needs(list);
   for (CLI::App* command : {add, remove, restore}) {

@@ -110,7 +110,7 @@ void AddEdits(CLI::App& pam, Invocation& invocation) {
   CLI::App* backups = pam.add_subcommand("backups", "List the backups");
   AddJsonFlag(*backups, options->json);
   CLI::App* restore = pam.add_subcommand("restore", "Go back to a backup");
-  restore->add_option("ID", options->backup, "The backup; the newest when there is none here");
+  AddBackupArgument(*restore, options->backup);
   for (CLI::App* command : {enable, disable, restore}) {
     AddDryRunFlag(*command, options->dryRun);
   }

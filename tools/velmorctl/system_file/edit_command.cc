@@ -13,6 +13,10 @@ void AddDryRunFlag(CLI::App& command, bool& dryRun) {
   command.add_flag("--dry-run", dryRun, "Show the change and write nothing, not even a backup");
 }
 
+void AddBackupArgument(CLI::App& command, std::string& backup) {
+  command.add_option("ID", backup, "The backup; without it the newest that no restore has left");
+}
+
 ExitCode ShowAndApply(const ChangeSet& changes, const RootFolder& root, bool dryRun, Situation& situation) {
   if (changes.ChangesNothing()) {
     std::cout << "There is nothing to change.\n";

@@ -14,6 +14,9 @@ namespace velmorctl {
 /// Adds the flag --dry-run.
 void AddDryRunFlag(CLI::App& command, bool& dryRun);
 
+/// Adds the argument that names a backup to restore, as PlanRestore() takes it.
+void AddBackupArgument(CLI::App& command, std::string& backup);
+
 /// Prints the planned changes as a unified diff and, unless `dryRun`, makes them and tells how to undo them.
 /// Says so when there is nothing to change. Throws Failure: NeedsRoot when the running system is to be
 /// changed by another user, Other when the changes could not be printed, and what ChangeSet::Apply() throws.
