@@ -32,7 +32,7 @@ done
 # Which folder of libraries it is depends on how the build was configured.
 [[ -n $(find "$folder/content/usr/lib" -name libvelmor.so.1) ]] || complain "it lacks libvelmor.so.1"
 
-for script in postinst prerm; do
+for script in postinst prerm postrm; do
   [[ -x $folder/control/$script ]] || complain "it lacks $script, or that cannot be run"
 done
 
