@@ -1,9 +1,11 @@
 #include "common/names.h"
+#include "common/paths.h"
 #include "common/smb_conf.h"
 #include "common/state.h"
 #include "common/status.h"
 #include "helper/domain_locator.h"
 #include "helper/journal.h"
+#include "helper/machine_password.h"
 #include "helper/netapi.h"
 #include "helper/operations.h"
 #include "helper/precheck.h"
@@ -39,13 +41,18 @@ void UnjoinWithAccount(const Call& call, const std::string& user) {
   }
 }
 
-void UnjoinWithoutAccount(const Call& call) {
+void UnjoinWithoutAccount(const Call& call, bool hasSecrets) {
   try {
     call.log.Run("unjoin", "removing the machine's secrets", [] {
       netapi::UnjoinLocally();
       return "removed; an account in the directory stays";
     });
-  } catch (const Failure&) {
+  } catch (const Failure& failure) {
+    if (failure.Code() != kNotJoined || hasSecrets) {
+      RemoveJournal();
+      throw Failure(kInternalError,
+                    std::string("the machine's secrets stay in ") + paths::kSecrets + ": " + failure.what());
+    }
     // There is nothing that a host without secrets could not leave.
     call.log.Note("unjoin", "this host has no machine secrets");
   }
@@ -64,11 +71,17 @@ std::string Leave(const Call& call) {
   });
   const bool disableAccount = withAccount && CheckCredentials(call, state, user);
 
+  // libnetapi finds the secrets by the domain in smb.conf, where the distribution's may stand again.
+  if (OwnerOfPresentSmbConf() != SmbConfOwner::kProvider) {
+    WriteSmbConf(FormatSmbConf(state, call.settings, KeytabUse::kKept));
+  }
+  // Asked before libnetapi, which takes secrets that it cannot open for none.
+  const bool hasSecrets = MachinePasswordTime(state.netbiosDomain).has_value();
   SaveJournal({Journal::Operation::kLeave, state.dnsDomain, state.netbiosDomain, state.hostName, ""});
   if (disableAccount) {
     UnjoinWithAccount(call, user);
   } else {
-    UnjoinWithoutAccount(call);
+    UnjoinWithoutAccount(call, hasSecrets);
   }
   FinishLeave(call.log);
   return "the host has left " + state.dnsDomain;

@@ -55,6 +55,19 @@ void Check(NET_API_STATUS result, const char* action) {
                                     std::to_string(code) + ")");
 }
 
+// Without a server's name it looks for a domain controller, although it does not need one; a name that stands
+// for this host spares that. It also insists on an account that it does not use.
+NET_API_STATUS RemoveSecrets() {
+  return NetUnjoinDomain("127.0.0.1", "none", "none", NETSETUP_JOIN_DOMAIN);
+}
+
+// A removal that did not reach the disk counts as a success. Only a host that has nothing left to remove is
+// told that it is not joined.
+void RequireSecretsAreGone() {
+  if (static_cast<uint32_t>(RemoveSecrets()) == kNotJoined) return;
+  throw Failure(kInternalError, "the machine's secrets could not be removed");
+}
+
 }  // namespace
 
 velmor::Secret ProvisionAccount(const std::string& dnsDomain, const std::string& computer,
@@ -95,13 +108,13 @@ void Unjoin(const std::string& user, const velmor::Secret& password) {
   Context();
   Check(NetUnjoinDomain(nullptr, user.c_str(), password.Text(), NETSETUP_JOIN_DOMAIN | NETSETUP_ACCT_DELETE),
         "leaving the domain");
+  RequireSecretsAreGone();
 }
 
 void UnjoinLocally() {
   Context();
-  // Without a server's name it looks for a domain controller, although it does not need one; a name that
-  // stands for this host spares that. It also insists on an account that it does not use.
-  Check(NetUnjoinDomain("127.0.0.1", "none", "none", NETSETUP_JOIN_DOMAIN), "removing the machine's secrets");
+  Check(RemoveSecrets(), "removing the machine's secrets");
+  RequireSecretsAreGone();
 }
 
 }  // namespace sambaprovider::netapi
