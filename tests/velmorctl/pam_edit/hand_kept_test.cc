@@ -454,6 +454,7 @@ TEST_F(PamHandKeptTest, AHostWithoutLoginServicesIsRefused) {
   const Outcome outcome = root_.Pam({"enable"});
   EXPECT_EQ(outcome.exitCode, NOT_READY);
   EXPECT_PRED2(Contains, outcome.errors, "there is no service through which people log in");
+  EXPECT_PRED2(Contains, outcome.errors, "velmorctl pam check --root " + root_.Path());
 }
 
 TEST_F(PamHandKeptTest, AParameterThatCannotStandInAPolicyIsRefused) {

@@ -32,6 +32,7 @@ class PamRefusalTest : public PreparedHost {
     const Outcome outcome = root_.Pam({"disable"});
     EXPECT_EQ(outcome.exitCode, NOT_READY);
     EXPECT_PRED2(Contains, outcome.errors, reason);
+    EXPECT_PRED2(Contains, outcome.errors, "velmorctl pam restore --root " + root_.Path() + ", if nothing");
     EXPECT_EQ(root_.Files(), before);
   }
 

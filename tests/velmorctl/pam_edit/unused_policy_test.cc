@@ -1,6 +1,7 @@
 // Lines that were put into files to which libpam does not come any more, and files that nobody can read.
 #include <sys/stat.h>
 
+#include <filesystem>
 #include <ostream>
 
 #include "velmorctl/pam_edit/debian_root.h"
@@ -162,6 +163,8 @@ INSTANTIATE_TEST_SUITE_P(
                               [](const std::string& path) {
                                 testsupport::WriteFile(path, std::string((1 << 20) + 1, '#'));
                               }},
+                      BadFile{"Circle", "Too many levels of symbolic links",
+                              [](const std::string& path) { std::filesystem::create_symlink("bad", path); }},
                       BadFile{"Pipe", "it is not a regular file",
                               [](const std::string& path) { EXPECT_EQ(mkfifo(path.c_str(), 0644), 0); }}),
     [](const auto& parameter) { return parameter.param.name; });

@@ -1,38 +1,22 @@
-#include "pam_edit/edit_plan.h"
-
 #include <algorithm>
 #include <set>
 
 #include "failure.h"
 #include "pam/check.h"
 #include "pam/login.h"
-#include "pam/policy_line.h"
 #include "pam/policy_root.h"
-#include "pam/policy_text.h"
 #include "pam/resolver.h"
+#include "pam_edit/edit_plan.h"
 #include "pam_edit/edit_spot.h"
+#include "pam_edit/host_policies.h"
 #include "pam_edit/login_proof.h"
 #include "pam_edit/model_agreement.h"
 #include "pam_edit/own_line.h"
 #include "pam_edit/profile_change.h"
-#include "pam_edit/profile_tool.h"
-#include "pam_edit/stack_difference.h"
-#include "pam_edit/written_policies.h"
 
 namespace velmorctl::pam {
 
 namespace {
-
-using Policies = std::vector<Policy>;
-
-Policies ResolveAll(const Draft& draft) {
-  FileReader reader = draft.Reader();
-  Policies policies;
-  for (const std::string& service : PolicyRoot(draft.Root()).Services()) {
-    policies.push_back(ResolvePolicy(service, reader));
-  }
-  return policies;
-}
 
 std::set<std::string> FilesOf(const Policy& policy) {
   std::set<std::string> files;
@@ -44,74 +28,8 @@ std::set<std::string> FilesOf(const Policy& policy) {
   return files;
 }
 
-/// What a service is written in.
-std::vector<std::string> FilesOfService(const std::string& service) {
-  std::vector<std::string> files;
-  for (const char* folder : policyFolders) {
-    files.push_back(std::string(folder) + "/" + service);
-  }
-  return files;
-}
-
-/// libpam may refuse a policy, or never come to a file, with own lines in it.
-WrittenPolicies ReadAllWritten(const Draft& draft) {
-  PolicyRoot root(draft.Root());
-  std::vector<std::string> files = root.FilesWithCapitals();
-  for (const std::string& service : root.Services()) {
-    for (std::string& file : FilesOfService(service)) {
-      files.push_back(std::move(file));
-    }
-  }
-  return ReadWrittenPolicies(std::move(files), draft.Reader());
-}
-
-/// Takes out what was put in before, whatever libpam makes of the policies now.
-Draft WithoutOwn(Draft draft, const WrittenPolicies& written) {
-  for (const auto& [file, content] : written.contents) {
-    std::string rest = WithoutOwnLines(content);
-    if (rest != content) {
-      draft.Write(file, rest);
-    }
-  }
-  RemoveProfile(draft);
-  return draft;
-}
-
-/// Why the policies differ in more than own entries; else empty.
-std::string UnexpectedDifference(const Policy& without, const Policy& with, const OwnModules& own) {
-  if (without.state != with.state) {
-    return "libpam would not read it as before";
-  }
-  for (Facility facility : facilities) {
-    std::string difference = UnexpectedDifference(without.StackOf(facility), with.StackOf(facility), own);
-    if (!difference.empty()) {
-      return difference;
-    }
-  }
-  return {};
-}
-
-bool IsChanged(const Policy& one, const Policy& other) {
-  return one.state != other.state ||
-         !std::equal(one.stacks.begin(), one.stacks.end(), other.stacks.begin(),
-                     [](const Stack& left, const Stack& right) { return left.size() == right.size(); });
-}
-
 std::size_t OwnLinesIn(const Draft& draft, const std::string& file) {
   return ModulesOfOwnLines(draft.Reader()(file).content.value_or("")).size();
-}
-
-/// Nobody can tell what is in them, and so nothing can be put in or taken out.
-std::vector<std::string> NotesOnUnreadable(const WrittenPolicies& written) {
-  std::vector<std::string> notes;
-  for (const auto& [file, problem] : written.unreadable) {
-    notes.push_back(file + " cannot be read (" + problem + "), and stays as it is.");
-  }
-  return notes;
-}
-
-std::string Place(const Origin& origin) {
-  return origin.file + ", line " + std::to_string(origin.line);
 }
 
 class EnablePlanner {
@@ -172,7 +90,7 @@ class EnablePlanner {
       throw Failure(ExitCode::HostNotReady, "there is no service through which people log in")
           .Detail("reason",
                   "no auth stack below " + bare_.Root().Shown(policyFolders[0]) + " reaches pam_unix.so")
-          .Try("velmorctl pam check");
+          .Try("velmorctl pam check" + bare_.Root().Option());
     }
   }
 
@@ -331,9 +249,6 @@ class EnablePlanner {
 
   /// Why the service must not become what it would; else empty.
   std::string ProblemOf(const Policy& before, const Policy& after, const Draft& next) const {
-    if (FindMeant(before.service) == nullptr && !IsChanged(before, after)) {
-      return {};
-    }
     std::string problem = UnexpectedDifference(before, after, {module_.name});
     if (problem.empty()) {
       problem = ProblemOfFiles(before, next);
@@ -409,76 +324,11 @@ void RequireModule(const RootFolder& root, const DirectoryModule& module) {
   }
 }
 
-OwnModules OwnModulesIn(const Draft& draft, const WrittenPolicies& written) {
-  OwnModules own = ModulesOfProfile(draft);
-  for (const auto& [file, content] : written.contents) {
-    std::vector<std::string> modules = ModulesOfOwnLines(content);
-    own.insert(modules.begin(), modules.end());
-  }
-  return own;
-}
-
-void RequireAsBefore(const Policies& before, const Policies& after, const OwnModules& own) {
-  for (std::size_t index = 0; index < before.size(); ++index) {
-    std::string problem = UnexpectedDifference(after[index], before[index], own);
-    if (!problem.empty()) {
-      throw Failure(ExitCode::HostNotReady,
-                    "the service '" + before[index].service + "' would not be what it was without the module")
-          .Detail("reason", problem)
-          .Try("velmorctl pam restore, if nothing else was changed since");
-    }
-  }
-}
-
-void RequireModelAgrees(const WrittenPolicies& before, const WrittenPolicies& after, const RootFolder& root,
-                        const OwnModules& own) {
-  for (const auto& [file, content] : before.contents) {
-    auto now = after.contents.find(file);
-    if (now != after.contents.end() && !ModelSeesOwnRemoved(content, now->second, own)) {
-      throw Failure(ExitCode::HostNotReady, "a policy file would not be what it was without the module")
-          .Detail("file", root.Shown(file))
-          .Detail("reason", "read another way, it would change in more than was asked for")
-          .Try("velmorctl pam restore, if nothing else was changed since");
-    }
-  }
-}
-
-std::vector<std::string> NotesOnRemaining(const WrittenPolicies& written, const std::string& module) {
-  std::vector<std::string> notes;
-  for (const auto& [file, content] : written.contents) {
-    PolicyText text(content);
-    for (const LogicalLine& logical : text.Lines()) {
-      PolicyLine line = ReadPolicyLine(logical.text);
-      if (line.kind == PolicyLine::Kind::Module && ModuleName(line.target) == ModuleName(module)) {
-        notes.push_back(Place({file, logical.firstLine}) + " calls " + line.target +
-                        " too; velmorctl did not write that, and it stays.");
-      }
-    }
-  }
-  return notes;
-}
-
 }  // namespace
 
 EditPlan PlanEnable(const RootFolder& root, const DirectoryModule& module) {
   RequireModule(root, module);
   return EnablePlanner(root, module).Run();
-}
-
-EditPlan PlanDisable(const RootFolder& root, const std::optional<DirectoryModule>& module) {
-  Draft current(root);
-  WrittenPolicies before = ReadAllWritten(current);
-  Draft bare = WithoutOwn(current, before);
-  WrittenPolicies after = ReadAllWritten(bare);
-  OwnModules own = OwnModulesIn(current, before);
-  RequireAsBefore(ResolveAll(current), ResolveAll(bare), own);
-  RequireModelAgrees(before, after, root, own);
-  std::vector<std::string> notes = NotesOnUnreadable(before);
-  if (module) {
-    std::vector<std::string> remaining = NotesOnRemaining(after, module->name);
-    notes.insert(notes.end(), remaining.begin(), remaining.end());
-  }
-  return {std::move(bare), std::move(notes), {}};
 }
 
 }  // namespace velmorctl::pam
