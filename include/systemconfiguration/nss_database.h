@@ -38,10 +38,10 @@ class SYSTEMCONFIGURATION_EXPORT NSSDatabase {
   /// No database: the value is 0, which has no keyword. Assign before use.
   NSSDatabase();
 
-  NSSDatabase(Database value);  // NOLINT(google-explicit-constructor)
+  NSSDatabase(Database value);  // NOLINT(google-explicit-constructor): callers rely on it
 
   /// Reads a keyword; case matters. Throws InvalidDatabaseException for any other word.
-  NSSDatabase(const std::string& word);  // NOLINT(google-explicit-constructor)
+  NSSDatabase(const std::string& word);  // NOLINT(google-explicit-constructor): callers rely on it
 
   NSSDatabase& operator=(Database value);
 
@@ -56,10 +56,10 @@ class SYSTEMCONFIGURATION_EXPORT NSSDatabase {
 
   /// The keyword. Throws InvalidDatabaseException for values outside the enumeration. Deliberate: its message
   /// is "Invalid Database: " less as many leading characters as the value says.
-  operator std::string() const;  // NOLINT(google-explicit-constructor)
+  operator std::string() const;  // NOLINT(google-explicit-constructor): callers rely on it
 
   /// The value.
-  operator Database() const;  // NOLINT(google-explicit-constructor)
+  operator Database() const;  // NOLINT(google-explicit-constructor): callers rely on it
 
  private:
   Database value_;

@@ -31,14 +31,14 @@ class SYSTEMCONFIGURATION_EXPORT PAMControl {
   PAMControl();
 
   /// The given value, without text.
-  PAMControl(Control value);  // NOLINT(google-explicit-constructor)
+  PAMControl(Control value);  // NOLINT(google-explicit-constructor): callers rely on it
 
   /// Stores both unchanged. Nothing checks that they fit each other.
   PAMControl(Control value, const std::string& text);
 
   /// Reads a keyword (case matters) or a bracketed control, whose whole text is kept and not examined.
   /// Throws InvalidControlException for anything else, the empty string included.
-  PAMControl(const std::string& text);  // NOLINT(google-explicit-constructor)
+  PAMControl(const std::string& text);  // NOLINT(google-explicit-constructor): callers rely on it
 
   /// Sets the value only. Deliberate: the text stays, and counts again once the value is `Bracketed`.
   PAMControl& operator=(Control value);
@@ -75,10 +75,10 @@ class SYSTEMCONFIGURATION_EXPORT PAMControl {
   /// The keyword, or a `Bracketed` control's text.
   /// Throws InvalidControlException for `Unset` and for values outside the enumeration. Deliberate: its
   /// message is "Invalid Control: " less as many leading characters as the value says.
-  operator std::string() const;  // NOLINT(google-explicit-constructor)
+  operator std::string() const;  // NOLINT(google-explicit-constructor): callers rely on it
 
   /// The value.
-  operator Control() const;  // NOLINT(google-explicit-constructor)
+  operator Control() const;  // NOLINT(google-explicit-constructor): callers rely on it
 
  private:
   Control value_;

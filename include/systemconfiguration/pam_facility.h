@@ -23,11 +23,11 @@ class SYSTEMCONFIGURATION_EXPORT PAMFacility {
   /// `Unset`.
   PAMFacility();
 
-  PAMFacility(Facility value);  // NOLINT(google-explicit-constructor)
+  PAMFacility(Facility value);  // NOLINT(google-explicit-constructor): callers rely on it
 
   /// Reads a keyword; case matters. Throws InvalidFacilityException for any other word. Deliberate: a leading
   /// '-', by which a line tolerates a missing module, is not understood.
-  PAMFacility(const std::string& word);  // NOLINT(google-explicit-constructor)
+  PAMFacility(const std::string& word);  // NOLINT(google-explicit-constructor): callers rely on it
 
   PAMFacility& operator=(Facility value);
 
@@ -42,10 +42,10 @@ class SYSTEMCONFIGURATION_EXPORT PAMFacility {
 
   /// The keyword. Throws InvalidFacilityException for `Unset` and for values outside the enumeration.
   /// Deliberate: its message is "Invalid Facility: " less as many leading characters as the value says.
-  operator std::string() const;  // NOLINT(google-explicit-constructor)
+  operator std::string() const;  // NOLINT(google-explicit-constructor): callers rely on it
 
   /// The value.
-  operator Facility() const;  // NOLINT(google-explicit-constructor)
+  operator Facility() const;  // NOLINT(google-explicit-constructor): callers rely on it
 
  private:
   Facility value_;
