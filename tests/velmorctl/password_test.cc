@@ -89,6 +89,22 @@ TEST_F(PasswordTest, CannotComeFromTwoPlaces) {
   EXPECT_EQ(Velmorctl(JoinWith({"--password-fd", "0", "--password-file", PASSWORD_FILE})).exitCode, 2);
 }
 
+TEST_F(PasswordTest, BelongsToAUserInALeave) {
+  MakeJoined();
+  EXPECT_EQ(Velmorctl({"leave", "--password-file", PASSWORD_FILE}).exitCode, 2);
+  EXPECT_EQ(Velmorctl({"leave", "--password-fd", "10"}, WithDescriptor(PASSWORD + "\n")).exitCode, 2);
+  EXPECT_TRUE(JoinedAtProvider());
+}
+
+TEST_F(PasswordTest, HasNoUseInAJoinThroughTheProxy) {
+  for (const std::string& option :
+       {std::string("--user=alice"), "--password-file=" + PASSWORD_FILE, std::string("--password-fd=0")}) {
+    const Outcome outcome = Velmorctl({"join", "--proxy", "10.9.8.7", option});
+    EXPECT_EQ(outcome.exitCode, 2) << option;
+    EXPECT_NE(outcome.errors.find("excludes"), std::string::npos) << outcome.errors;
+  }
+}
+
 TEST_F(PasswordTest, CannotBeGivenAsAnOption) {
   EXPECT_EQ(Velmorctl(JoinWith({"--password", PASSWORD})).exitCode, 2);
   EXPECT_EQ(Velmorctl(JoinWith({PASSWORD})).exitCode, 2);

@@ -197,10 +197,14 @@ void AddJoinCommand(CLI::App& root, Invocation& invocation) {
       join->add_option("--proxy", options->proxy,
                        "Let the CAM service at this IPv4 address create the computer account; needs no user");
   join->add_option("--container", options->container, "Where that service creates the account")->needs(proxy);
-  join->add_option("-U,--user", options->userName, "The account that may join hosts")->capture_default_str();
+  join->add_option("-U,--user", options->userName, "The account that may join hosts")
+      ->capture_default_str()
+      ->excludes(proxy);
   join->add_flag("--skip-hostname-check", options->skipHostNameCheck,
                  "Take the host's name as it is, and leave the hosts file and the DNS search list alone");
-  options->password.AddOptions(*join);
+  for (CLI::Option* password : options->password.AddOptions(*join)) {
+    password->excludes(proxy);
+  }
   Bind(*join, invocation, options, Join);
 }
 

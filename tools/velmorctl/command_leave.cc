@@ -133,10 +133,12 @@ ExitCode Leave(const Options& options, Situation& situation) {
 void AddLeaveCommand(CLI::App& root, Invocation& invocation) {
   auto options = std::make_shared<Options>();
   CLI::App* leave = root.add_subcommand("leave", "Leave the domain");
-  leave->add_option(
+  CLI::Option* user = leave->add_option(
       "-U,--user", options->userName,
       "An account that may remove the computer account; without it, the computer account stays");
-  options->password.AddOptions(*leave);
+  for (CLI::Option* password : options->password.AddOptions(*leave)) {
+    password->needs(user);
+  }
   Bind(*leave, invocation, options, Leave);
 }
 

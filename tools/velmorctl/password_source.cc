@@ -76,12 +76,14 @@ void ReadFile(const std::string& path, Secret& password) {
 
 }  // namespace
 
-void PasswordSource::AddOptions(CLI::App& command) {
+std::array<CLI::Option*, 2> PasswordSource::AddOptions(CLI::App& command) {
   CLI::Option* fileOption = command.add_option(
       "--password-file", file, "Read the password from the first line of this file ('-': standard input)");
-  command.add_option("--password-fd", descriptor, "Read the password from this open descriptor")
-      ->check(CLI::NonNegativeNumber)
-      ->excludes(fileOption);
+  CLI::Option* descriptorOption =
+      command.add_option("--password-fd", descriptor, "Read the password from this open descriptor")
+          ->check(CLI::NonNegativeNumber)
+          ->excludes(fileOption);
+  return {fileOption, descriptorOption};
 }
 
 void PasswordSource::Read(const std::string& userName, Secret& password) const {

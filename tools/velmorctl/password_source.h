@@ -3,6 +3,7 @@
 #define VELMORCTL_PASSWORD_SOURCE_H
 
 #include <CLI/App.hpp>
+#include <array>
 #include <optional>
 #include <string>
 
@@ -15,8 +16,8 @@ struct PasswordSource {
   std::string file;
   std::optional<int> descriptor;
 
-  /// Adds --password-file and --password-fd, which exclude each other.
-  void AddOptions(CLI::App& command);
+  /// Adds --password-file and --password-fd, which exclude each other, and returns both.
+  std::array<CLI::Option*, 2> AddOptions(CLI::App& command);
 
   /// Reads the password of `userName`: one line, without its end. May wait for whoever writes it.
   /// Throws Failure when it cannot be read, is empty or holds a null character, or when the file can be read
