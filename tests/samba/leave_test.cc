@@ -4,21 +4,20 @@
 #include <gtest/gtest.h>
 #include <sys/mount.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 extern "C" {
 #include <tdb.h>
 }
 
+#include <memory>
 #include <string>
 
 #include "common/attempt_log.h"
 #include "common/paths.h"
 #include "common/smb_conf.h"
 #include "common/state.h"
-#include "common/status.h"
 #include "helper/machine_password.h"
 #include "helper/operations.h"
+#include "in_child.h"
 #include "support/files.h"
 
 namespace sambaprovider {
@@ -43,36 +42,16 @@ class LeaveTest : public testing::Test {
     StoreSecrets();
   }
 
-  /// Returns the status. In a process of its own, since libnetapi keeps the secrets open.
   static uint32_t RunLeave() {
-    int ends[2];
-    if (pipe(ends) != 0) throw std::runtime_error("no pipe");
-    const pid_t child = fork();
-    if (child == 0) {
-      const uint32_t status = Perform();
-      _exit(write(ends[1], &status, sizeof status) == sizeof status ? 0 : 1);
-    }
-    close(ends[1]);
-    uint32_t status = 0;
-    EXPECT_EQ(read(ends[0], &status, sizeof status), ssize_t{sizeof status});
-    close(ends[0]);
-    waitpid(child, nullptr, 0);
-    return status;
-  }
-
- private:
-  static uint32_t Perform() {
-    try {
+    return StatusInChild([] {
       const AttemptLog log(1, "leave");
       Request request;
       request.fields = {{"operation", "leave"}};
       Leave({log, Settings{}, request});
-      return kSuccess;
-    } catch (const Failure& failure) {
-      return failure.Code();
-    }
+    });
   }
 
+ private:
   static void StoreSecrets() {
     tdb_context* const database = tdb_open(paths::kSecrets, 0, TDB_DEFAULT, O_RDWR | O_CREAT, 0600);
     ASSERT_NE(database, nullptr);

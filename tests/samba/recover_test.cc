@@ -18,6 +18,7 @@ extern "C" {
 #include "helper/journal.h"
 #include "helper/operations.h"
 #include "helper/undo.h"
+#include "in_child.h"
 #include "support/files.h"
 #include "support/interpose.h"
 #include "systemctl_script.h"
@@ -103,7 +104,7 @@ TEST_P(KilledWritingTest, TheSmbConfFromBeforeTheJoinComesBack) {
   SaveJournal({Journal::Operation::kJoin, "corp.example", "CORP", "SANDBOX", ""});
   WriteSmbConf("[global]\n");
   WriteUntilKilled("[global]\n  workgroup = CORP\n", GetParam());
-  RunRecover();
+  EXPECT_EQ(StatusInChild([this] { RunRecover(); }), 0U);
   EXPECT_EQ(testsupport::ReadFile(paths::kSmbConf), "before");
   EXPECT_EQ(testsupport::NamesIn(paths::kStateFolder), (std::vector<std::string>{"attempts.log"}));
 }
