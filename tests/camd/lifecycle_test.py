@@ -191,6 +191,12 @@ class ReloadTest(ServiceTest):
     def reload(self):
         self.service.process.send_signal(signal.SIGHUP)
 
+    def reload_for_another_client(self, **changes):
+        """Has the service read changed settings, which allow 127.0.0.9 only. Asks the directory for nothing."""
+        self.service.configure(access={"client-addresses": ["127.0.0.9"]}, **changes)
+        self.reload()
+        wait_until(lambda: self.service.create("-").code == 403)
+
     def testNewSettingsAreInForce(self):
         self.assertEqual(self.service.domain().code, 200)
         self.service.configure(access={"client-addresses": ["127.0.0.9"]})
@@ -216,11 +222,18 @@ class ReloadTest(ServiceTest):
         self.service.behave(**{"wait-for": "go"})
         creation = self.service.later(self.service.create)
         wait_until(self.service.helper_requests)
-        self.service.configure(access={"client-addresses": []})
-        self.reload()
-        wait_until(lambda: self.service.domain().code == 403)
+        self.reload_for_another_client()
         self.service.write("go", "")
         self.assertEqual(creation.result().code, 201)
+
+    def testDomainOfTheOldSettingsIsNotTold(self):
+        self.service.behave(**{"wait-for": "go"})
+        old = self.service.later(self.service.domain)
+        wait_until(self.service.helper_requests)
+        self.reload_for_another_client(directory={"domain": "other.example"})
+        self.service.write("go", "")
+        self.assertEqual(old.result().body["dnsDomainName"], "corp.example")
+        self.assertEqual(self.service.domain(source="127.0.0.9").body["dnsDomainName"], "other.example")
 
     def testAuditFileThatWasMovedAwayGetsASuccessor(self):
         self.service.domain()
@@ -237,6 +250,16 @@ class ReloadTest(ServiceTest):
         self.assertEqual(self.service.create().outcome, (500, 1069))
         self.reload()
         wait_until(lambda: self.service.create().code == 201)
+
+    def testRefusalOfThePasswordBeforeDoesNotCount(self):
+        self.service.behave(status=1069, **{"wait-for": "go"})
+        refused = self.service.later(self.service.create)
+        wait_until(self.service.helper_requests)
+        self.reload_for_another_client()
+        self.service.write("go", "")
+        self.assertEqual(refused.result().outcome, (500, 1069))
+        self.service.behave()
+        self.assertEqual(self.service.create(source="127.0.0.9").code, 201)
 
 
 class ConfigurationTest(unittest.TestCase):

@@ -46,7 +46,7 @@ if "status" in behaviour:
     answer(status=behaviour["status"], text=behaviour.get("text", "the directory says no"))
 
 if request["operation"] == "domain":
-    answer(netbiosDomainName="CORP", dnsDomainName="corp.example", domainSid="S-1-5-21-1-2-3")
+    answer(netbiosDomainName="CORP", dnsDomainName=request["domain"], domainSid="S-1-5-21-1-2-3")
 accounts = folder / "accounts"
 accounts.mkdir(exist_ok=True)
 account = accounts / request["computer"]

@@ -76,11 +76,13 @@ void DirectoryClient::RemoveUnusedAccount(const DirectorySettings& settings, con
 void DirectoryClient::ForgetRefusal() {
   const std::lock_guard lock(mutex_);
   refused_.reset();
+  forgotten_ = std::chrono::steady_clock::now();
 }
 
 Message DirectoryClient::AskHelper(const DirectorySettings& settings, const char* operation,
                                    Message request) {
   RefuseWhileLocked();
+  const auto begun = std::chrono::steady_clock::now();
   request.fields["operation"] = operation;
   request.fields["domain"] = settings.domain;
   request.fields["controller"] = settings.controller;
@@ -91,7 +93,7 @@ Message DirectoryClient::AskHelper(const DirectorySettings& settings, const char
   } catch (const Failure& failure) {
     if (failure.Code() == kServiceLogonFailed) {
       const std::lock_guard lock(mutex_);
-      refused_ = std::chrono::steady_clock::now();
+      if (begun > forgotten_) refused_ = std::chrono::steady_clock::now();
     }
     throw;
   }

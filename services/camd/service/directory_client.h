@@ -2,6 +2,7 @@
 #ifndef CAMD_SERVICE_DIRECTORY_CLIENT_H
 #define CAMD_SERVICE_DIRECTORY_CLIENT_H
 
+#include <chrono>
 #include <mutex>
 #include <optional>
 #include <string>
@@ -41,6 +42,7 @@ class DirectoryClient {
   // gone, kAccountInUse when it has been used or is another's.
   void RemoveUnusedAccount(const DirectorySettings& settings, const LedgerEntry& entry);
 
+  // Also those that are still to come of what was asked before.
   void ForgetRefusal();
 
  private:
@@ -49,6 +51,7 @@ class DirectoryClient {
 
   std::mutex mutex_;
   std::optional<std::chrono::steady_clock::time_point> refused_;
+  std::chrono::steady_clock::time_point forgotten_;
 };
 
 }  // namespace camd

@@ -5,18 +5,20 @@
 #include <chrono>
 #include <mutex>
 #include <optional>
+#include <string>
 
 #include "service/directory_client.h"
 
 namespace camd {
 
-// Safe for use by several threads.
+// What is known counts for its own domain only: a question that began under older settings may end after they
+// were changed. Safe for use by several threads.
 class DomainCache {
  public:
   explicit DomainCache(DirectoryClient& directory) : directory_(directory) {}
 
-  // What is known, if it was learnt in the last ten minutes.
-  std::optional<DomainInformation> Recent() const;
+  // What is known of the domain, if it was learnt in the last ten minutes.
+  std::optional<DomainInformation> Recent(const std::string& domain) const;
 
   // What is recent; otherwise asks the directory, and falls back on what is old when that does not answer.
   // Throws Failure.
@@ -27,6 +29,7 @@ class DomainCache {
  private:
   DirectoryClient& directory_;
   mutable std::mutex mutex_;
+  std::string domain_;
   std::optional<DomainInformation> known_;
   std::chrono::steady_clock::time_point learnt_;
 };

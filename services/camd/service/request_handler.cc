@@ -104,7 +104,8 @@ void RequestHandler::Route(const std::shared_ptr<Task>& task) {
 }
 
 void RequestHandler::HandleDomain(const std::shared_ptr<Task>& task) {
-  if (const auto recent = domain_.Recent()) return Finish(*task, AnswerWith(*recent));
+  const DirectorySettings& directory = task->configuration->directory;
+  if (const auto recent = domain_.Recent(directory.domain)) return Finish(*task, AnswerWith(*recent));
   Enqueue(task, [this, task] { return AnswerWith(domain_.Get(task->configuration->directory)); });
 }
 
