@@ -303,6 +303,18 @@ TEST_F(CamCommandTest, JoinAtAServerWithAnotherCertificateIsRefused) {
   EXPECT_FALSE(Called(JOIN_CALL));
 }
 
+TEST_F(CamCommandTest, JoinAtAServerWithAnotherCertificateSaysWhatToDo) {
+  Trust();
+  TlsServer other(Identity(), ServiceWithCreation(CREATED));
+  UsePort(other.Port());
+  const Outcome outcome = JoinThroughProxy();
+  EXPECT_NE(
+      outcome.errors.find("  try:      compare the service's fingerprints with \"velmorctl cam show\"; then "
+                          "\"velmorctl cam trust ADDRESS\"\n"),
+      std::string::npos)
+      << outcome.errors;
+}
+
 TEST_F(CamCommandTest, NameThatIsBusyMayBeThatOfAnAccountThatIsBeingRemoved) {
   Trust();
   TlsServer busy(identity_, ServiceWithCreation(HttpAnswer("409 Conflict", R"({"status": 1061})")));

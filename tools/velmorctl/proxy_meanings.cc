@@ -15,8 +15,6 @@ namespace authentication = quenix::authentication;
 
 constexpr char checkWay[] =
     "check the service's address and the port in /etc/quenix/velmor/cam.conf, and whether the service runs";
-constexpr char checkCertificate[] =
-    "compare the service's fingerprints with \"velmorctl cam show\"; then \"velmorctl cam trust ADDRESS\"";
 constexpr char askOperator[] = "ask the service's administrator; its log says why";
 constexpr char checkName[] =
     "give the host a name of at most 15 letters, digits and hyphens (hostnamectl set-hostname, /etc/hosts)";
@@ -53,7 +51,6 @@ constexpr CodeRow codeRows[] = {
      {ExitCode::Proxy,
       "the service hung up; the computer account may have been created, so have it removed first"}},
     {10060, {ExitCode::Proxy, checkWay}},
-    {0x80090325, {ExitCode::Proxy, checkCertificate}},
     {0x80090326, {ExitCode::Proxy, "the service must speak TLS 1.2 or newer at that port"}},
 };
 static_assert(std::is_sorted(std::begin(codeRows), std::end(codeRows),
@@ -66,6 +63,9 @@ constexpr Meaning otherStatus = {ExitCode::Proxy, askOperator};
 constexpr Meaning noPlugin = {ExitCode::Proxy,
                               "make /etc/quenix/velmor/camprovider.conf with the line: provider = \"cam\""};
 constexpr Meaning noPluginFile = {ExitCode::Proxy, "install the plug-in that camprovider.conf names"};
+constexpr Meaning otherCertificate = {
+    ExitCode::Proxy,
+    "compare the service's fingerprints with \"velmorctl cam show\"; then \"velmorctl cam trust ADDRESS\""};
 constexpr Meaning noCertificate = {ExitCode::Proxy, "velmorctl cam trust ADDRESS"};
 
 template <class Class>
@@ -90,6 +90,9 @@ const Meaning& ProxyMeaningOf(const std::exception& exception) {
   }
   if (Is<authentication::InvalidCAMProxyProviderException>(exception)) {
     return noPlugin;
+  }
+  if (Is<authentication::InvalidCAMCertificateException>(exception)) {
+    return otherCertificate;
   }
   if (Is<authentication::InvalidThumbprintStoreException>(exception)) {
     return noCertificate;
