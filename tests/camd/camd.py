@@ -173,9 +173,9 @@ class Service:
             self.kill()
         self._temporary.cleanup()
 
-    def command(self, *arguments):
+    def command(self, *arguments, **variables):
         return subprocess.run([SERVICE, "--config", self.configuration, *arguments], capture_output=True, text=True,
-                              check=False)
+                              check=False, env=os.environ | variables)
 
     def token(self, *options):
         done = self.command("token", "add", *options)

@@ -341,7 +341,22 @@ class ConfigurationTest(unittest.TestCase):
 
     def testCredentialOfTheSystemManagerIsWanted(self):
         self.service.configure(directory={"password-file": "camd-password"})
-        self.assert_refused("handed over no credential 'camd-password'")
+        started = self.service.command()
+        self.assertEqual(started.returncode, 1)
+        self.assertIn("handed over no credential 'camd-password'", started.stderr)
+
+    def testCheckNamesTheCredentialsThatItCannotSee(self):
+        self.service.configure(server={"key-file": "camd-key"}, directory={"password-file": "camd-password"})
+        checked = self.service.command("--check")
+        self.assertEqual((checked.returncode, checked.stdout, checked.stderr),
+                         (0, "not looked at: the credential 'camd-key'\nnot looked at: the credential 'camd-password'\n",
+                          ""))
+
+    def testCheckLooksAtTheCredentialsThatItIsHanded(self):
+        self.service.configure(server={"key-file": "camd.key"}, directory={"password-file": "camd-password"})
+        checked = self.service.command("--check", CREDENTIALS_DIRECTORY=str(self.service.folder))
+        self.assertEqual(checked.returncode, 1)
+        self.assertRegex(checked.stderr, "cannot open .*/camd-password")
 
     def testCertificateThatIsNoneIsRefused(self):
         self.service.write("camd.pem", "no certificate\n")

@@ -19,10 +19,14 @@ bool IsHandedOver(const std::string& name) {
   return name.find('/') == std::string::npos;
 }
 
+const char* FolderOfCredentials() {
+  return std::getenv("CREDENTIALS_DIRECTORY");
+}
+
 // The path that a name stands for.
 std::string PathOf(const std::string& name) {
   if (!IsHandedOver(name)) return name;
-  const char* folder = std::getenv("CREDENTIALS_DIRECTORY");
+  const char* folder = FolderOfCredentials();
   if (folder == nullptr) throw Failure(kInternalError, "systemd handed over no credential '" + name + "'");
   return std::string(folder) + "/" + name;
 }
@@ -80,6 +84,10 @@ Secret ReadCredentialFile(const std::string& name) {
   const OpenFile file = Open(name);
   CheckOwnersOnly(file, IsHandedOver(name));
   return Read(file);
+}
+
+bool IsOutOfReach(const std::string& name) {
+  return IsHandedOver(name) && FolderOfCredentials() == nullptr;
 }
 
 Secret ReadPublicFile(const std::string& name) {

@@ -13,6 +13,10 @@ namespace camd {
 // root and must be open to its owner only. Throws Failure (kInternalError) that names the file and the fault.
 Secret ReadCredentialFile(const std::string& name);
 
+// Whether the name is that of a credential and this process has none: systemd hands them over to the service
+// only, not to an administrator who starts the same program.
+bool IsOutOfReach(const std::string& name);
+
 // Reads a file in which nothing is secret, such as a certificate; the name may stand for a credential all the
 // same. Throws Failure (kInternalError).
 Secret ReadPublicFile(const std::string& name);

@@ -11,7 +11,8 @@ namespace camd {
 // WebServerError when it cannot begin.
 void Serve(const std::string& path);
 
-// Reads the configuration file and the files that it names, and changes nothing. Throws as Serve.
+// Reads the configuration file and the files that it names, and changes nothing. Passes over credentials of
+// systemd that this process does not have, and prints their names. Throws as Serve.
 void Check(const std::string& path);
 
 }  // namespace camd
