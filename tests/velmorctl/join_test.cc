@@ -157,7 +157,23 @@ TEST_F(JoinTest, UndoesTheJoinWhenItIsInterrupted) {
   EXPECT_FALSE(JoinedAtProvider());
   EXPECT_FALSE(Recorded());
   EXPECT_EQ(ActiveStore(), "None");
-  EXPECT_NE(outcome.errors.find("the host has left the domain again\n  changed:  nothing"), std::string::npos)
+  EXPECT_NE(
+      outcome.errors.find("the host has left the domain again\n"
+                          "  changed:  the computer account, which may stay in the directory, disabled\n"),
+      std::string::npos)
+      << outcome.errors;
+}
+
+TEST_F(JoinTest, SaysThatTheAccountStaysWhenTheJoinCannotBeRecorded) {
+  RunningProgram join(HangingJoin());
+  ASSERT_TRUE(Eventually([] { return Called(JOIN_CALL); }));
+  testsupport::WriteFile("/var/lib/quenix/configstore.db", std::string(4096, 'x'));
+  RemoveScript("hang.joinDomain");
+  const Outcome outcome = join.Wait();
+  EXPECT_EQ(outcome.exitCode, 11);
+  EXPECT_TRUE(Called("partDomain -"));
+  EXPECT_NE(outcome.errors.find("changed:  the computer account, which stays in the directory\n"),
+            std::string::npos)
       << outcome.errors;
 }
 

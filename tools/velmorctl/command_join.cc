@@ -8,6 +8,7 @@
 #include "directory.h"
 #include "failure.h"
 #include "operation_lock.h"
+#include "orvconfigstore/config_store_exception.h"
 #include "password_source.h"
 #include "progress.h"
 #include "secret.h"
@@ -25,6 +26,9 @@ using quenix::authentication::ActiveDirectoryConfigStore;
 
 /// As long as the library's own stores.
 constexpr std::chrono::seconds answerTimeout{60};
+
+/// What a leave without an account does not undo.
+constexpr char accountStays[] = "the computer account, which stays in the directory";
 
 constexpr char waitForEnd[] =
     "interrupted: when the provider's call has ended, its join is undone (again: leave at once)";
@@ -97,6 +101,8 @@ std::shared_ptr<Account> ReadAccount(const Options& options) {
     throw Interrupted(signalNumber, "the join could not be undone: \"velmorctl leave\" does it");
   }
   situation.ForgetChanges();
+  situation.AddChange(account ? "the computer account, which may stay in the directory, disabled"
+                              : accountStays);
   throw Interrupted(signalNumber, "the host has left the domain again");
 }
 
@@ -111,6 +117,18 @@ std::function<void()> JoinCall(const Options& options, Directory& directory,
   };
 }
 
+/// Only what comes after the join itself uses the configuration store; the library then leaves without an
+/// account.
+void AddWhatStays(const std::exception_ptr& failure, Situation& situation) {
+  try {
+    std::rethrow_exception(failure);
+  } catch (const OrvConfigStore::ConfigStoreException&) {
+    situation.AddChange(accountStays);
+  } catch (...) {
+    // Nothing was joined.
+  }
+}
+
 void JoinInterruptibly(const Options& options, Directory& directory, const std::shared_ptr<Account>& account,
                        Progress& progress, Situation& situation) {
   SignalPipe signals{SIGINT, SIGTERM, SIGHUP};
@@ -121,10 +139,11 @@ void JoinInterruptibly(const Options& options, Directory& directory, const std::
   std::function<void()> join = JoinCall(options, directory, account);
   CallOutcome outcome = RunWatched(join, progress, signals, waitForEnd);
   situation.providerReason = progress.ProviderReason();
-  if (outcome.failure && outcome.signalNumber) {
-    throw Interrupted(*outcome.signalNumber, "the join had failed by then");
-  }
   if (outcome.failure) {
+    AddWhatStays(outcome.failure, situation);
+    if (outcome.signalNumber) {
+      throw Interrupted(*outcome.signalNumber, "the join had failed by then");
+    }
     std::rethrow_exception(outcome.failure);
   }
   const std::string domain = JoinedDomain(options);
