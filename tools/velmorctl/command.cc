@@ -2,6 +2,9 @@
 
 #include <unistd.h>
 
+#include <CLI/App.hpp>
+#include <utility>
+
 #include "failure.h"
 
 namespace velmorctl {
@@ -25,6 +28,10 @@ constexpr AddCommand commands[] = {AddStatusCommand,
 
 std::span<const AddCommand> Commands() {
   return commands;
+}
+
+void Bind(CLI::App& command, Invocation& invocation, std::function<ExitCode(Situation&)> run) {
+  command.callback([&invocation, run = std::move(run)] { invocation.run = run; });
 }
 
 void RequireRoot(const std::string& doing) {

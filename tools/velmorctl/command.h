@@ -2,11 +2,11 @@
 #ifndef VELMORCTL_COMMAND_H
 #define VELMORCTL_COMMAND_H
 
-#include <CLI/App.hpp>
 #include <functional>
 #include <memory>
 #include <span>
 
+#include "command_line.h"
 #include "exit_codes.h"
 #include "situation.h"
 
@@ -37,13 +37,14 @@ void AddCamCommand(CLI::App& root, Invocation& invocation);
 void AddNameServiceCommand(CLI::App& root, Invocation& invocation);
 void AddPamCommand(CLI::App& root, Invocation& invocation);
 
+/// Lets the selection of `command` run `run`.
+void Bind(CLI::App& command, Invocation& invocation, std::function<ExitCode(Situation&)> run);
+
 /// Lets the selection of `command` run `run` with the options that were read for it.
 template <class Options>
 void Bind(CLI::App& command, Invocation& invocation, const std::shared_ptr<Options>& options,
           ExitCode (*run)(const Options&, Situation&)) {
-  command.callback([&invocation, options, run] {
-    invocation.run = [options, run](Situation& situation) { return run(*options, situation); };
-  });
+  Bind(command, invocation, [options, run](Situation& situation) { return run(*options, situation); });
 }
 
 /// Throws Failure unless the command runs as root; `doing` is what it is for.

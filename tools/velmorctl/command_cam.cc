@@ -1,4 +1,5 @@
 /// velmorctl cam: the service that creates the host's computer account.
+#include <CLI/App.hpp>
 #include <iostream>
 #include <optional>
 

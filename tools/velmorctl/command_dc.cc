@@ -1,4 +1,5 @@
 /// velmorctl dc: the domain controllers that the host uses.
+#include <CLI/App.hpp>
 #include <algorithm>
 #include <iostream>
 

@@ -1,4 +1,5 @@
 /// velmorctl join: makes the host a member of a domain.
+#include <CLI/App.hpp>
 #include <functional>
 #include <iostream>
 

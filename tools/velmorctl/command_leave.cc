@@ -1,4 +1,5 @@
 /// velmorctl leave: ends the host's membership in its domain.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "account.h"

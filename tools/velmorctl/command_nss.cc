@@ -1,4 +1,5 @@
 /// velmorctl nss: the name-service switch.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "command.h"

@@ -1,4 +1,5 @@
 /// velmorctl option: the host's advanced options.
+#include <CLI/App.hpp>
 #include <charconv>
 #include <iostream>
 

@@ -1,4 +1,6 @@
 /// velmorctl pam: the policies by which programs let users in.
+#include <CLI/App.hpp>
+
 #include "command.h"
 #include "pam/subcommands.h"
 

@@ -1,4 +1,5 @@
 /// velmorctl provider: which plug-in talks to the directory.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "authentication/configuration.h"

@@ -1,4 +1,5 @@
 /// velmorctl smartcard: the services that may authenticate with a smart card.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "command.h"

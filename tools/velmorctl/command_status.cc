@@ -1,4 +1,5 @@
 /// velmorctl status: where the host stands.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "command.h"

@@ -1,4 +1,5 @@
 /// velmorctl store: which store authenticates the host's users.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "authentication/authentication_store_factory.h"

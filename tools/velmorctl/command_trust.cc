@@ -1,4 +1,5 @@
 /// velmorctl trust: the trust with the joined domain, and of that with others.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "command.h"

@@ -1,3 +1,5 @@
+#include <CLI/App.hpp>
+
 #include "directory.h"
 
 #include "authentication/active_directory_config_store.h"

@@ -2,7 +2,6 @@
 #ifndef VELMORCTL_DIRECTORY_H
 #define VELMORCTL_DIRECTORY_H
 
-#include <CLI/App.hpp>
 #include <chrono>
 #include <deque>
 #include <memory>
@@ -13,6 +12,7 @@
 #include "answer_watch.h"
 #include "authentication/active_directory_store.h"
 #include "authentication/directory_records.h"
+#include "command_line.h"
 
 namespace velmorctl {
 

@@ -1,5 +1,6 @@
 #include "output.h"
 
+#include <CLI/App.hpp>
 #include <algorithm>
 #include <iostream>
 

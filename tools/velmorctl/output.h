@@ -2,10 +2,11 @@
 #ifndef VELMORCTL_OUTPUT_H
 #define VELMORCTL_OUTPUT_H
 
-#include <CLI/App.hpp>
 #include <nlohmann/json.hpp>
 #include <string>
 #include <vector>
+
+#include "command_line.h"
 
 namespace velmorctl {
 

@@ -3,6 +3,7 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
+#include <CLI/App.hpp>
 
 #include <cerrno>
 #include <cstring>

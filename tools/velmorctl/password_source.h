@@ -2,11 +2,11 @@
 #ifndef VELMORCTL_PASSWORD_SOURCE_H
 #define VELMORCTL_PASSWORD_SOURCE_H
 
-#include <CLI/App.hpp>
 #include <array>
 #include <optional>
 #include <string>
 
+#include "command_line.h"
 #include "secret.h"
 
 namespace velmorctl {

@@ -1,4 +1,5 @@
 /// velmorctl pam check: whether the policies do what they should.
+#include <CLI/App.hpp>
 #include <algorithm>
 #include <set>
 #include <utility>

@@ -34,9 +34,8 @@ using Stacks = std::array<Stack, facilities.size()>;
 
 std::string RemedyFor(Effect effect, const PolicyLine& line) {
   if (effect == Effect::AlwaysBad) {
-    return "write required, requisite, sufficient, optional or a list such as [success=ok default=bad]; as "
-           "it "
-           "stands, every answer of the module counts as bad";
+    return "write required, requisite, sufficient, optional or a list such as [success=ok default=bad]; "
+           "as it stands, every answer of the module counts as bad";
   }
   if (line.kind != PolicyLine::Kind::Module && line.target.empty()) {
     return "name a file, or remove the line; as it stands, libpam crashes";

@@ -1,4 +1,5 @@
 /// velmorctl pam show: what libpam runs for a service.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "failure.h"

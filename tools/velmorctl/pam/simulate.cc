@@ -1,4 +1,5 @@
 /// velmorctl pam simulate: whether a login would succeed, and why.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "failure.h"

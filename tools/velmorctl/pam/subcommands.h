@@ -2,9 +2,8 @@
 #ifndef VELMORCTL_PAM_SUBCOMMANDS_H
 #define VELMORCTL_PAM_SUBCOMMANDS_H
 
-#include <CLI/App.hpp>
-
 #include "command.h"
+#include "command_line.h"
 
 namespace velmorctl::pam {
 

@@ -1,4 +1,5 @@
 /// velmorctl pam diff, enable, disable, backups and restore: changes of the policies.
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "output.h"

@@ -1,5 +1,6 @@
 #include "system_file/edit_command.h"
 
+#include <CLI/App.hpp>
 #include <iostream>
 
 #include "command.h"

@@ -2,9 +2,9 @@
 #ifndef VELMORCTL_SYSTEM_FILE_EDIT_COMMAND_H
 #define VELMORCTL_SYSTEM_FILE_EDIT_COMMAND_H
 
-#include <CLI/App.hpp>
 #include <string>
 
+#include "command_line.h"
 #include "exit_codes.h"
 #include "situation.h"
 #include "system_file/change_set.h"

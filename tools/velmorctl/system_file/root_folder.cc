@@ -1,5 +1,6 @@
 #include "system_file/root_folder.h"
 
+#include <CLI/App.hpp>
 #include <cerrno>
 #include <deque>
 #include <filesystem>

@@ -4,9 +4,10 @@
 
 #include <sys/types.h>
 
-#include <CLI/App.hpp>
 #include <optional>
 #include <string>
+
+#include "command_line.h"
 
 namespace velmorctl {
 
