@@ -17,3 +17,14 @@ class MemoryTest(ServiceTest):
 
     def testWhatIsNoSecretIsFoundInMemory(self):
         self.assertTrue(self.service.memory_holds(b"/v1/computers"))
+
+
+class TokenMemoryTest(ServiceTest):
+
+    CHANGES = {"access": {"token-required": True}}
+
+    def testTokenIsNotLeftInMemory(self):
+        token = self.service.token()
+        self.assertEqual(self.service.create(token=token).code, 201)
+        secret = token.split(".")[1].encode()
+        wait_until(lambda: not self.service.memory_holds(secret))

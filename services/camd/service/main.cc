@@ -59,8 +59,8 @@ int Run(const CommandLine& line) {
 }  // namespace
 
 int main(int count, char** arguments) {
-  // The libraries for HTTP and TLS keep copies of what they send; this way they are overwritten when they are
-  // freed.
+  // The libraries for HTTP and TLS keep copies of what they send and receive; this way they are overwritten
+  // when they are freed. Not so pieces of up to 1032 bytes, but what those libraries keep text in is larger.
   mallopt(M_PERTURB, kErased);
   // The ledger and the audit log are nobody else's business.
   umask(S_IRWXG | S_IRWXO);
