@@ -21,6 +21,7 @@
 namespace {
 
 using HostMgmt::ReplaceFile;
+using HostMgmt::ReplaceFileIn;
 using HostMgmt::Lib::HostMgmtException;
 
 const std::string kFolder = "/run/files/";
@@ -147,6 +148,45 @@ TEST_F(ReplaceFileTest, ACircleOfLinksIsReported) {
   ASSERT_EQ(symlink("file.conf", kFile.c_str()), 0);
   EXPECT_THROW_WHAT(ReplaceFile(kFile, "new"), HostMgmtException,
                     "Unable to follow '" + kFile + "': Too many levels of symbolic links");
+}
+
+/// A file in a folder that is open already.
+class ReplaceFileInTest : public ReplaceFileTest {
+ protected:
+  void SetUp() override {
+    ReplaceFileTest::SetUp();
+    testsupport::MakeFolders("/run/outside");
+    testsupport::WriteFile("/run/outside/file.conf", "outside");
+    folder_ = open(kFolder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    ASSERT_GE(folder_, 0);
+  }
+  void TearDown() override { close(folder_); }
+
+  int folder_ = -1;
+};
+
+TEST_F(ReplaceFileInTest, WritesIntoTheFolderWhereverItsPathLeadsByNow) {
+  testsupport::WriteFile(kFile, "old");
+  ASSERT_EQ(rename("/run/files", "/run/moved"), 0);
+  ASSERT_EQ(symlink("/run/outside", "/run/files"), 0);
+  ReplaceFileIn(folder_, kFile, "new");
+  EXPECT_EQ(testsupport::ReadFile("/run/moved/file.conf"), "new");
+  EXPECT_EQ(testsupport::NamesIn("/run/moved"), std::vector<std::string>{"file.conf"});
+  EXPECT_EQ(testsupport::ReadFile("/run/outside/file.conf"), "outside");
+}
+
+TEST_F(ReplaceFileInTest, RefusesALinkInTheFilesPlace) {
+  ASSERT_EQ(symlink("/run/outside/file.conf", kFile.c_str()), 0);
+  EXPECT_THROW_WHAT(ReplaceFileIn(folder_, kFile, "new"), HostMgmtException,
+                    "Unable to write '" + kFile + "': it is not a regular file");
+  EXPECT_EQ(testsupport::ReadFile("/run/outside/file.conf"), "outside");
+}
+
+TEST_F(ReplaceFileInTest, MakesANewFileWithItsAttributesWhateverTheUmask) {
+  umask(0077);
+  ReplaceFileIn(folder_, kFile, "new", {.mode = 02640, .owner = getuid(), .group = getgid()});
+  EXPECT_EQ(testsupport::ReadFile(kFile), "new");
+  EXPECT_EQ(StatusOf(kFile).st_mode & 07777U, 02640U);
 }
 
 class MountedFileTest : public ReplaceFileTest {

@@ -6,6 +6,9 @@
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
+#include <string>
+#include <system_error>
 
 #define INTERPOSED extern "C" __attribute__((visibility("default")))
 
@@ -31,6 +34,13 @@ Result CallLoader(const char* name, Arguments... arguments) {
   const Result result = function(arguments...);
   pthread_mutex_unlock(&loaderMutex);
   return result;
+}
+
+/// The whole path of what is called `name` in the open folder.
+std::string PathIn(int folder, const std::string& name) {
+  std::error_code error;
+  const auto path = std::filesystem::read_symlink("/proc/self/fd/" + std::to_string(folder), error);
+  return error ? name : (path / name).string();
 }
 
 void* RealDlopen(const char* path, int flags) {
@@ -118,6 +128,16 @@ INTERPOSED int stat64(const char* path, struct stat64* status) noexcept {
 
 INTERPOSED int rename(const char* from, const char* to) noexcept {
   return calls::rename.Call(from, to);
+}
+
+INTERPOSED int renameat(int fromFolder, const char* from, int toFolder, const char* to) noexcept {
+  if (calls::rename.IsTakenOver()) {
+    return calls::rename.Call(testsupport::PathIn(fromFolder, from).c_str(),
+                              testsupport::PathIn(toFolder, to).c_str());
+  }
+  using Function = int (*)(int, const char*, int, const char*);
+  static const auto real = reinterpret_cast<Function>(testsupport::FindRealFunction("renameat"));
+  return real(fromFolder, from, toFolder, to);
 }
 
 INTERPOSED int chmod(const char* path, mode_t mode) noexcept {

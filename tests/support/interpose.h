@@ -56,6 +56,8 @@ class Interposed<Result(Arguments...)> {
     return (*handler)(arguments...);
   }
 
+  bool IsTakenOver() const { return handler_.load() != nullptr; }
+
   /// Null gives the function back, and waits until every thread has left the handler.
   void Use(const Handler* handler) {
     handler_.store(handler);
@@ -98,6 +100,7 @@ extern Interposed<int(char*, std::size_t)> gethostname;
 extern Interposed<int(const char*, hostent*, char*, std::size_t, hostent**, int*)> gethostbynameR;
 extern Interposed<hostent*(const char*)> gethostbyname;
 extern Interposed<int(const char*, struct stat*)> stat;
+/// Calls of renameat() come here too, with whole paths, while a test has taken it over.
 extern Interposed<int(const char*, const char*)> rename;
 extern Interposed<int(const char*, mode_t)> chmod;
 extern Interposed<int(int, uid_t, gid_t)> fchown;

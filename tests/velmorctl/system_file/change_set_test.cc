@@ -7,6 +7,7 @@
 
 #include <cerrno>
 #include <csignal>
+#include <filesystem>
 #include <system_error>
 
 #include "failure_of.h"
@@ -82,6 +83,20 @@ class AfterTheBackup : public testsupport::TakeOver<int(const char*, const char*
             action();
           }
           return result;
+        }) {}
+};
+
+/// Does something once, when a file whose path begins so has been written and has not taken its place yet.
+class DuringTheWrite : public testsupport::TakeOver<int(int)> {
+ public:
+  DuringTheWrite(const std::string& path, const std::function<void()>& action)
+      : TakeOver(testsupport::calls::fsync, [path, action, done = false](int descriptor) mutable {
+          const std::string link = "/proc/self/fd/" + std::to_string(descriptor);
+          if (!done && std::filesystem::read_symlink(link).string().starts_with(path)) {
+            done = true;
+            action();
+          }
+          return testsupport::calls::fsync.Real(descriptor);
         }) {}
 };
 
@@ -196,6 +211,21 @@ TEST_F(ChangeSetTest, FollowsNoLinkThatTakesAFoldersPlaceWhileTheBackupIsWritten
   });
   EXPECT_EQ(FailureOf([&] { changes_.Apply(); }).Code(), ExitCode::Conflict);
   EXPECT_EQ(ReadFile(outside.Path() + "file"), "file\n");
+}
+
+TEST_F(ChangeSetTest, FollowsNoLinkThatTakesAFoldersPlaceWhileTheFileIsWritten) {
+  const testsupport::ScratchFolder outside;
+  WriteFile(outside.Path() + "file", "file\n");
+  testsupport::MakeFolders(folder_ + "etc");
+  WriteFile(folder_ + "etc/file", "file\n");
+  changes_.Write(Read("/etc/file"), "changed\n");
+  const DuringTheWrite link(folder_ + "etc/.file.", [&] {
+    std::filesystem::rename(folder_ + "etc", folder_ + "old");
+    std::filesystem::create_symlink(outside.Path(), folder_ + "etc");
+  });
+  EXPECT_EQ(FailureOf([&] { changes_.Apply(); }).Code(), ExitCode::Configuration);
+  EXPECT_EQ(ReadFile(outside.Path() + "file"), "file\n");
+  EXPECT_EQ(ReadFile(folder_ + "old/file"), "changed\n");
 }
 
 TEST_F(ChangeSetTest, PutsNothingBackThroughALink) {

@@ -1,6 +1,5 @@
 #include "system_file/change_set.h"
 
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -18,25 +17,17 @@ namespace velmorctl {
 
 namespace {
 
-void MakeFile(const std::string& path, const std::string& content, const NewFileAttributes& attributes) {
-  HostMgmt::ReplaceFile(path, content, attributes.mode);
-  const bool anyOwner =
-      attributes.owner != static_cast<uid_t>(-1) || attributes.group != static_cast<gid_t>(-1);
-  if (!anyOwner) {
-    return;
-  }
-  // A change of owner takes some mode bits away.
-  if (lchown(path.c_str(), attributes.owner, attributes.group) != 0 ||
-      chmod(path.c_str(), attributes.mode) != 0) {
-    ThrowFileFailure("set the owner of", path, errno);
-  }
+void WriteFile(const std::string& path, const std::string& content, const NewFileAttributes& whenNew) {
+  const OpenFile folder = OpenFolder(FolderOf(path));
+  HostMgmt::ReplaceFileIn(folder.Descriptor(), path, content, whenNew);
 }
 
 void RemoveFile(const std::string& path) {
-  if (unlink(path.c_str()) != 0) {
+  const OpenFile folder = OpenFolder(FolderOf(path));
+  const std::string name = path.substr(path.rfind('/') + 1);
+  if (unlinkat(folder.Descriptor(), name.c_str(), 0) != 0 || fsync(folder.Descriptor()) != 0) {
     ThrowFileFailure("remove", path, errno);
   }
-  SyncFolder(FolderOf(path));
 }
 
 std::optional<std::string> ContentBefore(const Snapshot& snapshot) {
@@ -129,10 +120,8 @@ void ChangeSet::Perform(const Edit& edit) const {
   const std::string& path = edit.before.path;
   if (!edit.after) {
     RemoveFile(path);
-  } else if (edit.before.Exists()) {
-    HostMgmt::ReplaceFile(path, *edit.after);
   } else {
-    MakeFile(path, *edit.after, edit.whenNew);
+    WriteFile(path, *edit.after, edit.whenNew);
   }
 }
 
@@ -165,11 +154,9 @@ bool ChangeSet::PutBack(const Edit& edit) const {
     }
     if (!before) {
       RemoveFile(edit.before.path);
-    } else if (now) {
-      HostMgmt::ReplaceFile(edit.before.path, *before);
     } else {
       const FileIdentity& identity = *edit.before.identity;
-      MakeFile(edit.before.path, *before, {identity.mode & 07777, identity.owner, identity.group});
+      WriteFile(edit.before.path, *before, {identity.mode & 07777, identity.owner, identity.group});
     }
     return true;
   } catch (const std::exception&) {

@@ -2,12 +2,11 @@
 #ifndef VELMORCTL_SYSTEM_FILE_CHANGE_SET_H
 #define VELMORCTL_SYSTEM_FILE_CHANGE_SET_H
 
-#include <sys/types.h>
-
 #include <optional>
 #include <string>
 #include <vector>
 
+#include "hostmgmt/replace_file.h"
 #include "situation.h"
 #include "system_file/backup_store.h"
 #include "system_file/root_folder.h"
@@ -15,12 +14,7 @@
 
 namespace velmorctl {
 
-/// What a new file gets. An owner of -1 is the user who runs the command.
-struct NewFileAttributes {
-  mode_t mode = 0644;
-  uid_t owner = static_cast<uid_t>(-1);
-  gid_t group = static_cast<gid_t>(-1);
-};
+using HostMgmt::NewFileAttributes;
 
 /// Plans first and writes then; for one thread.
 class ChangeSet {
@@ -49,10 +43,10 @@ class ChangeSet {
   /// durably, and read again to prove that it is what was planned. Returns the ID of the backup. Signals
   /// that would end the command wait meanwhile; a wait for the disk is the longest that it takes.
   ///
-  /// Right before a file is replaced its name is resolved and the file read once more. What is left are the
-  /// moments until the new file takes its place: a change that a program makes in them without the editing
-  /// lock is lost, and whoever may write the folders of the root could put a link there that the writer
-  /// follows. So a root is to be one whose folders only trusted users may write.
+  /// Right before a file is replaced its name is resolved and the file read once more, and no link that
+  /// appears after that is followed. A change that a program makes in the moments until the new file takes
+  /// its place, without the editing lock, is lost. Backups are written by name, so /var of a root is to be
+  /// one that only trusted users may write.
   ///
   /// Throws Failure, after it has put back what it had changed and removed the backup: Conflict when another
   /// command is at it, or a file is not as it was read; Configuration when a file cannot be written, or is

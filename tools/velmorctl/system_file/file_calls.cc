@@ -1,7 +1,9 @@
 #include "system_file/file_calls.h"
 
 #include <fcntl.h>
+#include <linux/openat2.h>
 #include <sys/stat.h>
+#include <sys/syscall.h>
 #include <unistd.h>
 
 #include <cerrno>
@@ -24,6 +26,23 @@ void ThrowFileFailure(const std::string& doing, const std::string& path, int err
                 "cannot " + doing + " '" + path + "': " + SystemErrorText(errorNumber))
       .Detail("file", path)
       .Try(needsRoot ? "run the command as root" : "see that the file system is writable and has free space");
+}
+
+OpenFile OpenFolder(const std::string& path) {
+  open_how how = {};
+  how.flags = O_RDONLY | O_DIRECTORY | O_CLOEXEC;
+  how.resolve = RESOLVE_NO_SYMLINKS;
+  const auto descriptor = static_cast<int>(syscall(SYS_openat2, AT_FDCWD, path.c_str(), &how, sizeof(how)));
+  if (descriptor < 0 && errno == ELOOP) {
+    throw Failure(ExitCode::Conflict, "'" + path + "' was changed by somebody else meanwhile")
+        .Detail("file", path)
+        .Detail("reason", "a symbolic link is where none was")
+        .Try("run the command again, which then starts from the file as it is now");
+  }
+  if (descriptor < 0) {
+    ThrowFileFailure("open the folder", path, errno);
+  }
+  return OpenFile(descriptor);
 }
 
 bool IsFolder(const std::string& path) {

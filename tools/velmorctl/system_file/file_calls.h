@@ -29,6 +29,10 @@ class OpenFile {
 /// may do it when the system refuses it to another user.
 [[noreturn]] void ThrowFileFailure(const std::string& doing, const std::string& path, int errorNumber);
 
+/// Opens the folder for reading. Throws Failure: Conflict when a symbolic link is at the path or on the way
+/// there, which a path that RootFolder::Resolve() gave only has when somebody has put one there since.
+OpenFile OpenFolder(const std::string& path);
+
 bool IsFolder(const std::string& path);
 
 /// Makes the folder with this mode, whatever the umask. No failure when there is one. Throws Failure.
