@@ -41,17 +41,16 @@ class AllowListTest(ServiceTest):
 
 class RateTest(ServiceTest):
 
-    CHANGES = {"access": {"requests-per-minute": 5}}
+    CHANGES = {"access": {"requests-per-minute": 1}}
 
     def testClientThatAsksTooOftenHasToWait(self):
-        answers = [self.service.domain() for _ in range(6)]
-        self.assertEqual([answer.code for answer in answers], [200] * 5 + [429])
-        self.assertEqual(answers[-1].body["status"], 1816)
-        self.assertIn(int(answers[-1].headers["Retry-After"]), range(1, 13))
+        self.assertEqual(self.service.domain().code, 200)
+        refused = self.service.domain()
+        self.assertEqual(refused.outcome, (429, 1816))
+        self.assertIn(int(refused.headers["Retry-After"]), range(1, 61))
 
     def testOtherClientsDoNotHaveToWait(self):
-        for _ in range(6):
-            self.service.domain()
+        self.service.domain()
         self.assertEqual(self.service.domain(source="127.0.0.2").code, 200)
 
 

@@ -58,7 +58,7 @@ def tls(version=None, **limits):
 
 def connect(source="127.0.0.1", context=None):
     """An open TLS connection."""
-    plain = socket.create_connection(("127.0.0.1", PORT), timeout=20, source_address=(source, 0))
+    plain = socket.create_connection(("127.0.0.1", PORT), timeout=60, source_address=(source, 0))
     return (context or tls()).wrap_socket(plain)
 
 

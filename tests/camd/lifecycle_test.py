@@ -49,10 +49,11 @@ class LongStopTest(ServiceTest):
     CHANGES = {"server": {"helpers": 1}, "directory": {"helper-timeout-seconds": 2}}
 
     def testRequestThatWouldHoldUpTheEndIsToldToComeAgain(self):
-        self.service.behave(silent=True)
+        # A shell, which has begun long before its time is over.
+        self.service.write("helper", f"#!/bin/sh\necho begun >>{self.service.folder}/begun\nexec sleep 1000\n", 0o755)
         creations = [self.service.later(self.service.create, f"host{number}.corp.example") for number in range(8)]
         # The first two are with the directory then, one after the other, and all others wait.
-        wait_until(lambda: len(self.service.helper_requests()) == 2)
+        wait_until(lambda: len(self.service.read("begun").splitlines()) >= 2)
         self.service.process.send_signal(signal.SIGTERM)
         outcomes = [creation.result().outcome for creation in creations]
         self.assertEqual(self.service.wait(), 0)
@@ -149,9 +150,11 @@ class UnusedAccountTest(ServiceTest):
         self.service.write("accounts/HOST2", "used")
         self.restart_later(3)
         wait_until(lambda: self.service.ledger() == [("HOST2", "kept")])
+        self.service.create("host3.corp.example")
         self.restart_later(3)
-        self.service.domain()
-        self.assertEqual(len(self.service.helper_requests("remove-unused")), 1)
+        wait_until(lambda: self.service.ledger() == [("HOST2", "kept"), ("HOST3", "removed")])
+        self.assertEqual([request["computer"] for request in self.service.helper_requests("remove-unused")],
+                         ["HOST2", "HOST3"])
 
     def testAccountStaysWhenTheDirectoryDoesNotAnswer(self):
         self.service.create()

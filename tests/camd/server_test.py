@@ -13,7 +13,7 @@ MALFORMED_BODIES = ["", "{", "[]", "7", "null", '"host2"', "{}", '{"hostName": 7
                     '{"hostName": "host2.corp.example", "container": 7}',
                     '{"hostName": "host2.corp.example", "container": "a\\u0000b"}', "\xff\xfe", "[" * 5000,
                     '{"hostName": "host2.corp.example"} {"hostName": "host3.corp.example"}']
-NO_HTTP = [b"\r\n\r\n", b"GET\r\n\r\n", b"\0" * 1000 + b"\r\n\r\n", b"GET /v1/domain HTTP/9.9\r\n\r\n",
+NO_HTTP = [b"GET\r\n\r\n", b"GET /v1/domain HTTP/9.9\r\n\r\n",
            b"POST /v1/computers HTTP/1.1\r\nHost: a\r\nContent-Length: -5\r\n\r\n",
            b"POST /v1/computers HTTP/1.1\r\nHost: a\r\nContent-Length: 99999999999999999999999\r\n\r\n",
            b"POST /v1/computers HTTP/1.1\r\nHost: a\r\nTransfer-Encoding: chunked\r\n\r\nZZZ\r\n\r\n",
@@ -22,8 +22,6 @@ NO_HTTP = [b"\r\n\r\n", b"GET\r\n\r\n", b"\0" * 1000 + b"\r\n\r\n", b"GET /v1/do
 
 
 class ServerTest(ServiceTest):
-    # Short, so that clients that take too long are seen soon.
-    CHANGES = {"server": {"request-timeout-seconds": 2}}
 
     def assert_serving(self):
         self.assertEqual(self.service.domain().code, 200)
@@ -101,6 +99,25 @@ class ServerTest(ServiceTest):
             with self.subTest(method=method, path=path):
                 self.assertEqual(self.service.ask(method, path).outcome, (405, 50))
 
+    def testNewNegotiationIsNotForTheClientToAskFor(self):
+        """Each would cost the service far more than the client."""
+        asked = subprocess.run(["openssl", "s_client", "-connect", f"127.0.0.1:{PORT}", "-tls1_2"], input="R\n" * 20,
+                               capture_output=True, text=True, check=False, timeout=60)
+        self.assertLessEqual(asked.stderr.count("RENEGOTIATING"), 1, asked.stderr)
+        self.assert_serving()
+
+    def testOneConnectionTakesSeveralRequests(self):
+        with connect() as connection:
+            for _ in range(3):
+                connection.sendall(b"GET /v1/domain HTTP/1.1\r\nHost: a\r\n\r\n")
+                self.assertEqual(status_of_next(connection), 200)
+
+
+class ImpatientServerTest(ServiceTest):
+    """Clients that take too long, which is seen soon."""
+
+    CHANGES = {"server": {"request-timeout-seconds": 2}}
+
     def testClientThatSendsAByteNowAndThenIsCutOff(self):
         with connect() as connection:
             begin = time.monotonic()
@@ -124,28 +141,21 @@ class ServerTest(ServiceTest):
             connection.sendall(b"\x16\x03\x01\x02\x00\x01\x00\x01\xfc\x03\x03")
             self.assertTrue(is_closed(connection))
 
-    def testNewNegotiationIsNotForTheClientToAskFor(self):
-        """Each would cost the service far more than the client."""
-        asked = subprocess.run(["openssl", "s_client", "-connect", f"127.0.0.1:{PORT}", "-tls1_2"], input="R\n" * 20,
-                               capture_output=True, text=True, check=False, timeout=60)
-        self.assertLessEqual(asked.stderr.count("RENEGOTIATING"), 1, asked.stderr)
-        self.assert_serving()
-
     def testConnectionWithoutRequestIsCutOff(self):
         with connect() as connection:
             self.assertTrue(is_closed(connection))
 
-    def testOneConnectionTakesSeveralRequests(self):
-        with connect() as connection:
-            for _ in range(3):
-                connection.sendall(b"GET /v1/domain HTTP/1.1\r\nHost: a\r\n\r\n")
-                self.assertEqual(status_of_next(connection), 200)
+    def testBytesThatBecomeNoRequestAreCutOff(self):
+        for text in (b"\r\n\r\n", b"\0" * 1000 + b"\r\n\r\n"):
+            with self.subTest(text=text[:60]):
+                self.assertEqual(raw(text), b"")
 
 
 class CrowdTest(ServiceTest):
     """Two hundred connections at once."""
 
-    CHANGES = {"server": {"request-timeout-seconds": 5}}
+    # So long that nobody is cut off while the crowd gathers, however busy the machine is.
+    CHANGES = {"server": {"request-timeout-seconds": 600}}
     COUNT = 200
 
     def ask_all_at_once(self):
@@ -163,30 +173,26 @@ class CrowdTest(ServiceTest):
             thread.start()
         for thread in threads:
             thread.join()
-        return codes
+        self.assertEqual(codes, [b"200"] * self.COUNT)
 
     def testAllAreAnswered(self):
         self.service.domain()
-        self.assertEqual(self.ask_all_at_once(), [b"200"] * self.COUNT)
+        self.ask_all_at_once()
+
+    def assert_served_beside(self, crowd):
+        self.assertEqual(self.service.domain().code, 200)
+        for connection in crowd:
+            self.assertFalse(is_closed(connection, limit=0.001))
+            connection.close()
 
     def testOthersAreServedBesideIdleOnes(self):
-        idle = [socket.create_connection(("127.0.0.1", PORT), timeout=20) for _ in range(self.COUNT)]
-        begin = time.monotonic()
-        self.assertEqual(self.service.domain().code, 200)
-        self.assertLess(time.monotonic() - begin, 4)
-        for connection in idle:
-            self.assertTrue(is_closed(connection))
-            connection.close()
+        self.assert_served_beside([socket.create_connection(("127.0.0.1", PORT)) for _ in range(self.COUNT)])
 
     def testOthersAreServedBesideSlowOnes(self):
         slow = [connect() for _ in range(self.COUNT)]
         for connection in slow:
             connection.sendall(b"POST /v1/computers HTTP/1.1\r\nContent-Length: 100\r\n")
-        begin = time.monotonic()
-        self.assertEqual(self.service.domain().code, 200)
-        self.assertLess(time.monotonic() - begin, 4)
-        for connection in slow:
-            connection.close()
+        self.assert_served_beside(slow)
 
     def testMemoryStaysFlat(self):
         self.service.domain()

@@ -14,6 +14,18 @@ server role = member server
 disable netbios = yes
 """
 
+# Makes the account and keeps the answer for itself.
+SILENT_HELPER = """#!/usr/bin/python3
+import json, pathlib, subprocess, sys, time
+line = sys.stdin.buffer.readline()
+request = json.loads(line)
+secret = sys.stdin.buffer.read(request["secretSize"])
+answer = subprocess.run(["/usr/libexec/velmor/velmor-camd-helper"], input=line + secret, stdout=subprocess.PIPE).stdout
+if request["operation"] == "create":
+    pathlib.Path("FOLDER/made").touch()
+    time.sleep(1000)
+sys.stdout.buffer.write(answer)
+"""
 # The helper, which sees another program in the place of the one that makes accounts; that one is FOLDER/real.
 HELPER_WITH_OTHER_PROVISION = """#!/bin/sh
 touch FOLDER/real
@@ -191,18 +203,22 @@ class CamUnusedAccountTest(CamAccountsTest):
         self.host.must("net", "ads", "testjoin", "-P")
 
     def testServiceThatIsKilledInTheMiddleLeavesNothingForGood(self):
-        service = self.service(directory=self.SETTINGS)
+        service = self.service()
+        service.stop()
+        service.write("helper", SILENT_HELPER.replace("FOLDER", service.folder), "700")
+        service.write("camd.conf", service.configuration(
+            {"directory": self.SETTINGS | {"helper": f"{service.folder}/helper"}}))
+        service.start()
         name = self.name("n1")
         body = json.dumps([["POST", "/v1/computers", {"hostName": f"{name}.corp.example"}]])
         self.host.must("sh", "-c", f'cat >/run/requests; /usr/bin/python3 -B {SOURCE}/tests/lab/cam_asker.py {ADDRESS} '
                        f"{service.port} </run/requests >/run/answers 2>&1 &", given=body)
-        while not self.ledger(service):
-            time.sleep(0.02)
+        service.wait_for(f"test -e {service.folder}/made")
         service.stop(signal.SIGKILL)
         self.assertEqual(self.ledger(service), [(name.upper(), "requested")])
+        self.assertIsNotNone(self.directory.computer(name.upper()))
         self.assertEqual(self.look_for_unused_ones(service), [(name.upper(), "removed")])
         self.assertIsNone(self.directory.computer(name.upper()))
-        self.assertEqual(self.outcome(service, name), (201, 0))
 
 
 class CamUnknownOutcomeTest(CamAccountsTest):

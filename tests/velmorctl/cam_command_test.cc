@@ -47,10 +47,8 @@ class CamCommandTest : public PreparedHost {
     testsupport::CopyFile(VELMORCTL_CAM_PLUGIN, testsupport::PLUGIN_FOLDER + "libcam.so");
     WriteFile(testsupport::CAMPROVIDER_CONF, "provider = \"cam\"\n");
     WriteFile("/etc/hosts", "127.0.0.1 localhost\n127.0.1.1 sandbox.corp.example sandbox\n");
-    UsePort(server_.Port());
+    camtest::WriteSettings(server_.Port());
   }
-
-  static void UsePort(std::uint16_t port) { camtest::WriteSettings(port, "request-timeout = \"2\"\n"); }
 
   static Outcome Trust(const std::string& source = LOOPBACK) {
     return Velmorctl({"cam", "trust", source, "--yes"});
@@ -198,7 +196,7 @@ TEST_F(CamCommandTest, TrustOfAServerThatTricklesEndsInTime) {
     }
     close(connection);
   });
-  UsePort(port);
+  camtest::WriteSettings(port);
   const Outcome outcome = Trust();
   EXPECT_EQ(outcome.exitCode, 12);
   EXPECT_NE(outcome.errors.find("  reason:   no answer within 10 seconds\n"), std::string::npos)
@@ -238,7 +236,7 @@ TEST_F(CamCommandTest, TestAcceptsTheImportedCertificate) {
 TEST_F(CamCommandTest, TestAsksAServerWithAnotherCertificateNothing) {
   Trust();
   TlsServer other(Identity(), ServiceWithCreation(CREATED));
-  UsePort(other.Port());
+  camtest::WriteSettings(other.Port());
   const Outcome outcome = Velmorctl({"cam", "test", LOOPBACK, "--json"});
   EXPECT_EQ(outcome.exitCode, 12);
   EXPECT_EQ(outcome.Json()["accepted"], false);
@@ -298,7 +296,7 @@ TEST_F(CamCommandTest, JoinWithoutAPlugInSaysWhatToDo) {
 TEST_F(CamCommandTest, JoinAtAServerWithAnotherCertificateIsRefused) {
   Trust();
   TlsServer other(Identity(), ServiceWithCreation(CREATED));
-  UsePort(other.Port());
+  camtest::WriteSettings(other.Port());
   EXPECT_EQ(JoinThroughProxy().exitCode, 12);
   EXPECT_FALSE(Called(JOIN_CALL));
 }
@@ -306,7 +304,7 @@ TEST_F(CamCommandTest, JoinAtAServerWithAnotherCertificateIsRefused) {
 TEST_F(CamCommandTest, JoinAtAServerWithAnotherCertificateSaysWhatToDo) {
   Trust();
   TlsServer other(Identity(), ServiceWithCreation(CREATED));
-  UsePort(other.Port());
+  camtest::WriteSettings(other.Port());
   const Outcome outcome = JoinThroughProxy();
   EXPECT_NE(
       outcome.errors.find("  try:      compare the service's fingerprints with \"velmorctl cam show\"; then "
@@ -318,7 +316,7 @@ TEST_F(CamCommandTest, JoinAtAServerWithAnotherCertificateSaysWhatToDo) {
 TEST_F(CamCommandTest, NameThatIsBusyMayBeThatOfAnAccountThatIsBeingRemoved) {
   Trust();
   TlsServer busy(identity_, ServiceWithCreation(HttpAnswer("409 Conflict", R"({"status": 1061})")));
-  UsePort(busy.Port());
+  camtest::WriteSettings(busy.Port());
   EXPECT_NE(JoinThroughProxy().errors.find(
                 "  try:      an account of this name is being created or removed: try again in a minute\n"),
             std::string::npos);
@@ -354,7 +352,7 @@ TEST_P(CamStatusTest, OfTheServiceEndsWithTheCodeOfTheProxy) {
   const std::string status = std::to_string(GetParam());
   TlsServer refusing(identity_,
                      ServiceWithCreation(HttpAnswer("403 Forbidden", R"({"status": )" + status + "}")));
-  UsePort(refusing.Port());
+  camtest::WriteSettings(refusing.Port());
   const Outcome outcome = JoinThroughProxy();
   EXPECT_EQ(outcome.exitCode, 12);
   EXPECT_NE(outcome.errors.find("  status:   " + status + "\n  changed:  nothing\n  try:      "),
