@@ -64,6 +64,8 @@ INSTANTIATE_TEST_SUITE_P(
         Addition{"OnlyTheOneLine", "# passwd: files\npasswd: files\nfoo bar\npasswd_compat: nis\n", "passwd",
                  "winbind", "", "# passwd: files\npasswd: files winbind\nfoo bar\npasswd_compat: nis\n"},
         Addition{"ToADatabaseWithoutServices", "hosts:\n", "hosts", "files", "", "hosts: files\n"},
+        Addition{"BehindTheBlanksOfADatabaseWithoutServices", "group: \npasswd: files\n", "group", "winbind",
+                 "", "group: files winbind\npasswd: files\n"},
         Addition{"FilesToo", "passwd:\n", "passwd", "winbind", "", "passwd: files winbind\n"},
         Addition{"FilesFirst", "passwd:   sss\n", "passwd", "files", "", "passwd:   files sss\n"},
         Addition{"BehindWhatStandsBeforeFiles", "passwd: sss files\n", "passwd", "winbind", "",

@@ -157,11 +157,15 @@ std::string WithInsertion(const std::string& text, std::size_t position, std::st
 
 std::string InsertBefore(const SwitchFile& file, const SwitchLine& line, std::size_t place,
                          const std::string& written) {
-  if (place == 0 && !line.services.empty()) {
+  if (line.services.empty()) {
+    // Behind the blanks that are there: the model of the switch refuses a file with one behind a service.
+    const std::size_t position = std::min(file.Text().find_first_not_of(" \t", line.servicesBegin), line.end);
+    return WithInsertion(file.Text(), position, position > line.servicesBegin ? written : " " + written);
+  }
+  if (place == 0) {
     return WithInsertion(file.Text(), line.services.front().begin, written + " ");
   }
-  const std::size_t position = place == 0 ? line.servicesBegin : line.services[place - 1].end;
-  return WithInsertion(file.Text(), position, " " + written);
+  return WithInsertion(file.Text(), line.services[place - 1].end, " " + written);
 }
 
 /// Services that end the search when they do not know a name, and so keep it from the new one.
