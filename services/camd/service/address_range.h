@@ -5,7 +5,6 @@
 #include <sys/socket.h>
 
 #include <array>
-#include <compare>
 #include <cstdint>
 #include <optional>
 #include <string>
@@ -27,7 +26,8 @@ class Address {
   Address Client() const;
   const std::array<uint8_t, 16>& Bytes() const { return bytes_; }
 
-  auto operator<=>(const Address& other) const = default;
+  bool operator==(const Address& other) const = default;
+  bool operator<(const Address& other) const { return bytes_ < other.bytes_; }
 
  private:
   std::array<uint8_t, 16> bytes_ = {};
