@@ -12,22 +12,11 @@
 #include "failure.h"
 #include "terminal.h"
 #include "text.h"
+#include "velmor/unique_fd.h"
 
 namespace velmorctl {
 
 namespace {
-
-class Descriptor {
- public:
-  explicit Descriptor(int number) : number_(number) {}
-  Descriptor(const Descriptor&) = delete;
-  Descriptor& operator=(const Descriptor&) = delete;
-  ~Descriptor() { close(number_); }
-  int Number() const noexcept { return number_; }
-
- private:
-  int number_;
-};
 
 Failure Unreadable(const std::string& source, const char* reason) {
   return Failure(ExitCode::Usage, "the password cannot be read from " + source + ": " + reason)
@@ -66,13 +55,13 @@ void ReadFile(const std::string& path, Secret& password) {
   if (number < 0) {
     throw Unreadable("'" + path + "'", SystemErrorText(errno).c_str());
   }
-  Descriptor file(number);
+  velmor::UniqueFd file(number);
   struct stat status = {};
-  if (fstat(file.Number(), &status) == 0 && S_ISREG(status.st_mode) && (status.st_mode & S_IROTH) != 0) {
+  if (fstat(file.Get(), &status) == 0 && S_ISREG(status.st_mode) && (status.st_mode & S_IROTH) != 0) {
     throw Failure(ExitCode::Usage, "the password file '" + path + "' can be read by everybody")
         .Try("chmod 600 '" + path + "', and change the password if others may have seen it");
   }
-  ReadLine(file.Number(), "'" + path + "'", password);
+  ReadLine(file.Get(), "'" + path + "'", password);
 }
 
 }  // namespace

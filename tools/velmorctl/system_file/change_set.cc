@@ -18,14 +18,14 @@ namespace velmorctl {
 namespace {
 
 void WriteFile(const std::string& path, const std::string& content, const NewFileAttributes& whenNew) {
-  const OpenFile folder = OpenFolder(FolderOf(path));
-  HostMgmt::ReplaceFileIn(folder.Descriptor(), path, content, whenNew);
+  const velmor::UniqueFd folder = OpenFolder(FolderOf(path));
+  HostMgmt::ReplaceFileIn(folder.Get(), path, content, whenNew);
 }
 
 void RemoveFile(const std::string& path) {
-  const OpenFile folder = OpenFolder(FolderOf(path));
+  const velmor::UniqueFd folder = OpenFolder(FolderOf(path));
   const std::string name = path.substr(path.rfind('/') + 1);
-  if (unlinkat(folder.Descriptor(), name.c_str(), 0) != 0 || fsync(folder.Descriptor()) != 0) {
+  if (unlinkat(folder.Get(), name.c_str(), 0) != 0 || fsync(folder.Get()) != 0) {
     ThrowFileFailure("remove", path, errno);
   }
 }

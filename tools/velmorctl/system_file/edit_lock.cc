@@ -7,6 +7,7 @@
 
 #include "failure.h"
 #include "system_file/backup_store.h"
+#include "system_file/file_calls.h"
 
 namespace velmorctl {
 
@@ -15,7 +16,7 @@ EditLock::EditLock(const RootFolder& root)
   if (!folder_.IsOpen()) {
     ThrowFileFailure("open the folder", root.Shown(backupFolder), errno);
   }
-  if (flock(folder_.Descriptor(), LOCK_EX | LOCK_NB) != 0) {
+  if (flock(folder_.Get(), LOCK_EX | LOCK_NB) != 0) {
     throw Failure(ExitCode::Conflict, "another velmorctl is changing system files")
         .Try("wait until it has ended, and run the command again");
   }

@@ -2,8 +2,8 @@
 #ifndef VELMORCTL_SYSTEM_FILE_EDIT_LOCK_H
 #define VELMORCTL_SYSTEM_FILE_EDIT_LOCK_H
 
-#include "system_file/file_calls.h"
 #include "system_file/root_folder.h"
+#include "velmor/unique_fd.h"
 
 namespace velmorctl {
 
@@ -15,7 +15,7 @@ class EditLock {
   explicit EditLock(const RootFolder& root);
 
  private:
-  OpenFile folder_;
+  velmor::UniqueFd folder_;
 };
 
 }  // namespace velmorctl

@@ -14,12 +14,6 @@
 
 namespace velmorctl {
 
-OpenFile::~OpenFile() {
-  if (IsOpen()) {
-    close(descriptor_);
-  }
-}
-
 void ThrowFileFailure(const std::string& doing, const std::string& path, int errorNumber) {
   const bool needsRoot = (errorNumber == EACCES || errorNumber == EPERM) && geteuid() != 0;
   throw Failure(needsRoot ? ExitCode::NeedsRoot : ExitCode::Configuration,
@@ -28,7 +22,7 @@ void ThrowFileFailure(const std::string& doing, const std::string& path, int err
       .Try(needsRoot ? "run the command as root" : "see that the file system is writable and has free space");
 }
 
-OpenFile OpenFolder(const std::string& path) {
+velmor::UniqueFd OpenFolder(const std::string& path) {
   open_how how = {};
   how.flags = O_RDONLY | O_DIRECTORY | O_CLOEXEC;
   how.resolve = RESOLVE_NO_SYMLINKS;
@@ -42,7 +36,7 @@ OpenFile OpenFolder(const std::string& path) {
   if (descriptor < 0) {
     ThrowFileFailure("open the folder", path, errno);
   }
-  return OpenFile(descriptor);
+  return velmor::UniqueFd(descriptor);
 }
 
 bool IsFolder(const std::string& path) {
@@ -64,25 +58,25 @@ void MakeDurableFolder(const std::string& path, mode_t mode) {
 }
 
 void WriteNewFile(const std::string& path, std::string_view content) {
-  const OpenFile file(open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC | O_NOFOLLOW, 0600));
+  const velmor::UniqueFd file(open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC | O_NOFOLLOW, 0600));
   if (!file.IsOpen()) {
     ThrowFileFailure("make", path, errno);
   }
   while (!content.empty()) {
-    const ssize_t written = write(file.Descriptor(), content.data(), content.size());
+    const ssize_t written = write(file.Get(), content.data(), content.size());
     if (written < 0 && errno != EINTR) {
       ThrowFileFailure("write", path, errno);
     }
     content.remove_prefix(written < 0 ? 0 : static_cast<std::size_t>(written));
   }
-  if (fsync(file.Descriptor()) != 0) {
+  if (fsync(file.Get()) != 0) {
     ThrowFileFailure("write", path, errno);
   }
 }
 
 void SyncFolder(const std::string& path) {
-  const OpenFile folder(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-  if (!folder.IsOpen() || fsync(folder.Descriptor()) != 0) {
+  const velmor::UniqueFd folder(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  if (!folder.IsOpen() || fsync(folder.Get()) != 0) {
     ThrowFileFailure("write the folder", path, errno);
   }
 }

@@ -7,23 +7,9 @@
 #include <string>
 #include <string_view>
 
+#include "velmor/unique_fd.h"
+
 namespace velmorctl {
-
-/// Owns an open file descriptor and closes it.
-class OpenFile {
- public:
-  /// Takes over `descriptor`; -1 stands for none.
-  explicit OpenFile(int descriptor) : descriptor_(descriptor) {}
-  OpenFile(const OpenFile&) = delete;
-  OpenFile& operator=(const OpenFile&) = delete;
-  ~OpenFile();
-
-  bool IsOpen() const { return descriptor_ >= 0; }
-  int Descriptor() const { return descriptor_; }
-
- private:
-  int descriptor_;
-};
 
 /// A failure (Configuration) of a call on a file: "cannot DOING 'PATH': " and the system's text. Only root
 /// may do it when the system refuses it to another user.
@@ -31,7 +17,7 @@ class OpenFile {
 
 /// Opens the folder for reading. Throws Failure: Conflict when a symbolic link is at the path or on the way
 /// there, which a path that RootFolder::Resolve() gave only has when somebody has put one there since.
-OpenFile OpenFolder(const std::string& path);
+velmor::UniqueFd OpenFolder(const std::string& path);
 
 bool IsFolder(const std::string& path);
 

@@ -128,12 +128,13 @@ std::optional<FileProblem> ReadOpenFile(int descriptor, Snapshot& snapshot) {
 
 std::optional<FileProblem> Read(Snapshot& snapshot) {
   // Without O_NONBLOCK a pipe in the file's place would hold the command up.
-  const OpenFile file(open(snapshot.path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW | O_NOCTTY));
+  const velmor::UniqueFd file(
+      open(snapshot.path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOFOLLOW | O_NOCTTY));
   if (!file.IsOpen()) {
     return CannotRead(snapshot, errno);
   }
   for (int attempt = 0; attempt < readingAttempts; ++attempt) {
-    std::optional<FileProblem> problem = ReadOpenFile(file.Descriptor(), snapshot);
+    std::optional<FileProblem> problem = ReadOpenFile(file.Get(), snapshot);
     if (problem || snapshot.identity) {
       return problem;
     }
