@@ -18,10 +18,11 @@ namespace {
 
 constexpr mode_t permissionBits = 07777;
 
-/// The first error on the way of the file's data to the disk; 0 when it is there.
+/// The first error on the way of the file's data to the disk; 0 when it is there. A file that has gone has
+/// none, and it is the rename that fails.
 int SyncToDisk(const std::string& path) {
   const int descriptor = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
-  if (descriptor < 0) return errno;
+  if (descriptor < 0) return errno == ENOENT ? 0 : errno;
   const int error = fsync(descriptor) == 0 ? 0 : errno;
   close(descriptor);
   return error;

@@ -230,6 +230,18 @@ TEST_F(AtomicFileStreamTest, AFailedRenameIsAnErrorWhateverTheStatusWas) {
   }
 }
 
+TEST_F(AtomicFileStreamTest, ATemporaryFileThatHasGoneFailsTheRename) {
+  for (const bool targetExists : {false, true}) {
+    if (targetExists) WriteFile(target_, "old");
+    AtomicFileStream stream(target_.c_str(), std::ios_base::out);
+    const std::string temporary = Temporary();
+    testsupport::RemoveFile(temporary);
+    EXPECT_THROW_WHAT(stream.Commit(), IOError,
+                      "Unable to rename '" + temporary + "' to '" + target_ + "': No such file or directory");
+    EXPECT_EQ(Exists(target_), targetExists);
+  }
+}
+
 TEST_F(AtomicFileStreamTest, AFailedModeChangeIsReportedWithTheNewContentInPlace) {
   WriteFile(target_, "old");
   const TakeOver refuse(calls::chmod, [](const char*, mode_t) {
