@@ -164,6 +164,20 @@ TEST_F(JoinTest, UndoesTheJoinWhenItIsInterrupted) {
       << outcome.errors;
 }
 
+TEST_F(JoinTest, SaysWhyItHadFailedWhenItIsInterrupted) {
+  Script("status.joinDomain", "86");
+  RunningProgram join(HangingJoin());
+  ASSERT_TRUE(Eventually([] { return Called(JOIN_CALL); }));
+  join.Signal(SIGINT);
+  ASSERT_TRUE(Eventually([&join] { return join.ErrorsSoFar().find("interrupted: ") != std::string::npos; }));
+  RemoveScript("hang.joinDomain");
+  const Outcome outcome = join.Wait();
+  EXPECT_EQ(outcome.signalNumber, SIGINT);
+  EXPECT_NE(outcome.errors.find("interrupted; the join had failed by then: Exception 0x00000056: "),
+            std::string::npos)
+      << outcome.errors;
+}
+
 TEST_F(JoinTest, SaysThatTheAccountStaysWhenTheJoinCannotBeRecorded) {
   RunningProgram join(HangingJoin());
   ASSERT_TRUE(Eventually([] { return Called(JOIN_CALL); }));

@@ -143,7 +143,7 @@ void JoinInterruptibly(const Options& options, Directory& directory, const std::
   if (outcome.failure) {
     AddWhatStays(outcome.failure, situation);
     if (outcome.signalNumber) {
-      throw Interrupted(*outcome.signalNumber, "the join had failed by then");
+      throw Interrupted(*outcome.signalNumber, FailedByThen("the join", outcome.failure));
     }
     std::rethrow_exception(outcome.failure);
   }

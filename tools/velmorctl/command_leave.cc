@@ -53,10 +53,8 @@ std::string HowItEnded(const std::exception_ptr& failure) {
   } catch (const OrvConfigStore::ConfigStoreException& exception) {
     return std::string("the host has left the domain, but the record of the join is still there: ") +
            exception.what();
-  } catch (const std::exception& exception) {
-    return std::string("the leave had failed by then: ") + exception.what();
   } catch (...) {
-    return "the leave had failed by then";
+    return FailedByThen("the leave", failure);
   }
 }
 

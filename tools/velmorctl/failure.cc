@@ -16,6 +16,17 @@ Failure& Failure::Try(std::string advice) {
   return *this;
 }
 
+std::string FailedByThen(const std::string& what, const std::exception_ptr& failure) {
+  const std::string failed = what + " had failed by then";
+  try {
+    std::rethrow_exception(failure);
+  } catch (const std::exception& exception) {
+    return failed + ": " + exception.what();
+  } catch (...) {
+    return failed;
+  }
+}
+
 Interrupted::Interrupted(int signalNumber, std::string state)
     : signalNumber_(signalNumber), state_(std::move(state)) {}
 

@@ -37,6 +37,9 @@ class Failure : public std::exception {
   std::string advice_;
 };
 
+/// How the call of an interrupted command failed: "WHAT had failed by then", and why when that is known.
+std::string FailedByThen(const std::string& what, const std::exception_ptr& failure);
+
 /// A signal asked the command to end. main() ends the process by that signal, so that the caller sees it.
 class Interrupted : public std::exception {
  public:
