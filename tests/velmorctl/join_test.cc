@@ -237,11 +237,24 @@ TEST_F(JoinTest, StaysJoinedWhenOnlyTheVerificationIsInterrupted) {
 }
 
 TEST_F(JoinTest, ReportsATrustThatIsBrokenAfterTheJoin) {
-  Script("trustState", "3");
+  Script("trustState", "10");
   const Outcome outcome = Velmorctl(Join());
   EXPECT_EQ(outcome.exitCode, 4);
-  EXPECT_NE(outcome.errors.find("account-unusable"), std::string::npos) << outcome.errors;
+  EXPECT_NE(outcome.errors.find("could not be verified: broken"), std::string::npos) << outcome.errors;
   EXPECT_EQ(ActiveStore(), "Active Directory");
+}
+
+TEST_F(JoinTest, WaitsForAControllerThatDoesNotKnowTheNewAccountYet) {
+  Script("trustState", "3");
+  RunningProgram join(Join());
+  EXPECT_TRUE(Eventually([&join] {
+    return join.ErrorsSoFar().find("waiting until the controller in use knows the account") !=
+           std::string::npos;
+  }));
+  RemoveScript("trustState");
+  const Outcome outcome = join.Wait();
+  EXPECT_EQ(outcome.exitCode, 0) << outcome.errors;
+  EXPECT_NE(outcome.errors.find(" s] trust state: healthy\n"), std::string::npos) << outcome.errors;
 }
 
 TEST_F(JoinTest, ChecksTheHostNameAndSaysWhatIsWrong) {

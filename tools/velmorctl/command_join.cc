@@ -1,13 +1,17 @@
 /// velmorctl join: makes the host a member of a domain.
 #include <CLI/App.hpp>
+#include <chrono>
 #include <functional>
 #include <iostream>
+#include <thread>
+#include <utility>
 
 #include "account.h"
 #include "authentication/active_directory_config_store.h"
 #include "command.h"
 #include "directory.h"
 #include "failure.h"
+#include "new_account.h"
 #include "operation_lock.h"
 #include "orvconfigstore/config_store_exception.h"
 #include "password_source.h"
@@ -155,10 +159,22 @@ void JoinInterruptibly(const Options& options, Directory& directory, const std::
   }
 }
 
+Answer<TrustState> StateAfterJoin(Directory& directory, Progress& progress) {
+  bool told = false;
+  return AskAboutNewAccount([&directory] { return directory.State(); },
+                            [&progress, &told] {
+                              if (!std::exchange(told, true)) {
+                                progress.Step("waiting until the controller in use knows the account");
+                              }
+                              std::this_thread::sleep_for(std::chrono::seconds(1));
+                              progress.Tick();
+                            });
+}
+
 /// Asks the domain whether the join holds. From here on a signal ends the command at once.
 ExitCode Verify(Directory& directory, Progress& progress, const std::string& requestedDomain) {
   auto configuration = directory.Configuration();
-  Answer<TrustState> state = directory.State();
+  Answer<TrustState> state = StateAfterJoin(directory, progress);
   const std::string& domain = configuration.value.activeDomain.dnsName;
   progress.Step("trust state: " + TrustStateName(state.value) + (state.live ? "" : " (no answer in time)"));
   std::cout << "The host is joined to " << Printable(domain.empty() ? requestedDomain : domain)
