@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include <cerrno>
+#include <filesystem>
 #include <utility>
 #include <vector>
 
@@ -96,6 +97,27 @@ TEST_F(BeforeJoinTest, FilesThatWereNotThereAreRemoved) {
   before_join::GiveBack();
   EXPECT_FALSE(testsupport::Exists(paths::kSmbConf));
   EXPECT_FALSE(testsupport::Exists(paths::kKeytab));
+}
+
+TEST_F(BeforeJoinTest, TheKeytabBehindALinkIsGivenBackThere) {
+  const std::string target = "/etc/samba/host.keytab";
+  testsupport::WriteFile(target, "before");
+  std::filesystem::create_symlink(target, paths::kKeytab);
+  before_join::PutAside();
+  testsupport::WriteFile(paths::kKeytab, "new");
+  before_join::GiveBack();
+  EXPECT_EQ(testsupport::ReadFile(target), "before");
+  EXPECT_TRUE(std::filesystem::is_symlink(paths::kKeytab));
+}
+
+TEST_F(BeforeJoinTest, ANewKeytabBehindALinkIsRemovedThere) {
+  const std::string target = "/etc/samba/host.keytab";
+  std::filesystem::create_symlink(target, paths::kKeytab);
+  before_join::PutAside();
+  testsupport::WriteFile(paths::kKeytab, "new");
+  before_join::GiveBack();
+  EXPECT_FALSE(testsupport::Exists(target));
+  EXPECT_TRUE(std::filesystem::is_symlink(paths::kKeytab));
 }
 
 TEST_F(BeforeJoinTest, AnAdministratorsNewFileIsLeftAlone) {

@@ -4,6 +4,8 @@
 
 #include <gtest/gtest.h>
 
+#include <filesystem>
+
 #include "expect_failure.h"
 #include "support/files.h"
 
@@ -63,6 +65,13 @@ TEST(SmbConfTest, AnAdministratorsFileIsNotReplaceable) {
   testsupport::MakeFolders("/etc/samba");
   const testsupport::SmallFileSystem folder("/etc/samba", 65536);
   testsupport::WriteFile("/etc/samba/smb.conf", "[global]\n  workgroup = MINE\n");
+  EXPECT_FAILURE(RequireSmbConfIsReplaceable(), 1064);
+}
+
+TEST(SmbConfTest, ALinkToTheUntouchedDefaultIsNotReplaceable) {
+  testsupport::MakeFolders("/etc/samba");
+  const testsupport::SmallFileSystem folder("/etc/samba", 65536);
+  std::filesystem::create_symlink("/usr/share/samba/smb.conf", "/etc/samba/smb.conf");
   EXPECT_FAILURE(RequireSmbConfIsReplaceable(), 1064);
 }
 

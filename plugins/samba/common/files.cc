@@ -121,6 +121,12 @@ bool CopyFile(const std::string& from, const std::string& to) {
   return true;
 }
 
+std::string FileBehindLinks(const std::string& path) {
+  std::error_code error;
+  const std::filesystem::path file = std::filesystem::canonical(path, error);
+  return error ? path : file.string();
+}
+
 void RemoveFile(const std::string& path) {
   if (unlink(path.c_str()) == 0) {
     FlushFolderOf(path);
@@ -146,6 +152,11 @@ void RemoveFolder(const std::string& path) {
 
 bool FileExists(const std::string& path) {
   return access(path.c_str(), F_OK) == 0;
+}
+
+bool IsLink(const std::string& path) {
+  std::error_code error;
+  return std::filesystem::is_symlink(path, error);
 }
 
 }  // namespace sambaprovider

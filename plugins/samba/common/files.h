@@ -25,6 +25,9 @@ void ReplaceFile(const std::string& path, std::string_view content, mode_t mode)
 /// nothing, when there is no file to copy.
 bool CopyFile(const std::string& from, const std::string& to);
 
+/// The file that a path leads to when links stand in it; the path itself when there is none.
+std::string FileBehindLinks(const std::string& path);
+
 /// Removes a file and flushes its folder; one that does not exist is no failure.
 void RemoveFile(const std::string& path);
 
@@ -35,6 +38,8 @@ void MakeFolder(const std::string& path, mode_t mode);
 void RemoveFolder(const std::string& path);
 
 bool FileExists(const std::string& path);
+
+bool IsLink(const std::string& path);
 
 }  // namespace sambaprovider
 

@@ -79,6 +79,8 @@ SmbConfOwner OwnerOfSmbConf(const std::optional<std::string>& present,
 }
 
 SmbConfOwner OwnerOfPresentSmbConf() {
+  // Whoever made a link wants the file elsewhere, where others may use it too.
+  if (IsLink(paths::kSmbConf)) return SmbConfOwner::kAdministrator;
   const auto present = ReadFile(paths::kSmbConf);
   // A kill may have come between the new file and the note that it is the last one.
   if (present && present == ReadFile(paths::kNextSmbConf)) return SmbConfOwner::kProvider;
@@ -87,12 +89,11 @@ SmbConfOwner OwnerOfPresentSmbConf() {
 
 void RequireSmbConfIsReplaceable() {
   if (OwnerOfPresentSmbConf() != SmbConfOwner::kAdministrator) return;
-  throw Failure(
-      kHostConfigurationInTheWay,
-      std::string(paths::kSmbConf) +
-          " is neither the provider's nor the distribution's untouched one, so it is not replaced; move it "
-          "away or restore " +
-          paths::kDistributionSmbConf);
+  throw Failure(kHostConfigurationInTheWay, std::string(paths::kSmbConf) +
+                                                " is a link, or neither the provider's nor the "
+                                                "distribution's untouched one, so it is not replaced; "
+                                                "move it away or restore " +
+                                                paths::kDistributionSmbConf);
 }
 
 void WriteSmbConf(const std::string& text) {

@@ -35,7 +35,8 @@ void PutAside() {
 void GiveBack() {
   if (!FileExists(paths::kBeforeFolder)) return;
   if (OwnerOfPresentSmbConf() != SmbConfOwner::kAdministrator) GiveBack(kSmbConfCopy, paths::kSmbConf);
-  GiveBack(kKeytabCopy, paths::kKeytab);
+  // The keys were written to the file behind a link; a file in the link's place would leave them there.
+  GiveBack(kKeytabCopy, FileBehindLinks(paths::kKeytab));
 }
 
 bool ServiceWasRunning() {
