@@ -7,6 +7,7 @@
 #include <algorithm>
 #include <memory>
 
+#include "common/names.h"
 #include "common/status.h"
 
 namespace sambaprovider {
@@ -97,6 +98,30 @@ std::vector<std::string> LocateControllers(const std::string& dnsDomain) {
     throw Failure(kNoSuchDomain, "DNS names no controller of " + dnsDomain + " (" + reason + ")");
   }
   throw Failure(kNoLogonServers, "the name servers do not answer for " + dnsDomain + " (" + reason + ")");
+}
+
+std::vector<std::string> ControllersInTurn(const std::vector<std::string>& preferred,
+                                           const std::vector<std::string>& located) {
+  constexpr size_t kMostPreferred = 2;
+  std::vector<std::string> turn = preferred;
+  turn.resize(std::min(turn.size(), kMostPreferred));
+  for (const std::string& controller : located) {
+    const bool known = std::any_of(turn.begin(), turn.end(), [&controller](const std::string& other) {
+      return EqualWithoutCase(controller, other);
+    });
+    if (!known) turn.push_back(controller);
+  }
+  return turn;
+}
+
+std::vector<std::string> ControllersToTry(const AttemptLog& log, const std::string& dnsDomain,
+                                          const std::vector<std::string>& preferred) {
+  std::vector<std::string> located;
+  log.Run("locate", "asking DNS for the controllers of " + dnsDomain, [&] {
+    located = LocateControllers(dnsDomain);
+    return std::to_string(located.size()) + " known, the first is " + located.front();
+  });
+  return ControllersInTurn(preferred, located);
 }
 
 }  // namespace sambaprovider

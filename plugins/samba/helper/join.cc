@@ -125,17 +125,6 @@ State MemberState(const std::string& dnsDomain, const std::string& netbiosDomain
   return state;
 }
 
-// The preferred controllers first, then what DNS names.
-std::vector<std::string> ControllersOf(const AttemptLog& log, const std::string& domain) {
-  std::vector<std::string> controllers = LoadState().preferredDomainControllers;
-  log.Run("locate", "asking DNS for the controllers of " + domain, [&] {
-    const std::vector<std::string> found = LocateControllers(domain);
-    controllers.insert(controllers.end(), found.begin(), found.end());
-    return std::to_string(found.size()) + " known, the first is " + found.front();
-  });
-  return controllers;
-}
-
 }  // namespace
 
 std::string Join(const Call& call) {
@@ -148,7 +137,8 @@ std::string Join(const Call& call) {
     CheckUser(user);
     return computer + " may join";
   });
-  LogonRequest logon{domain, ControllersOf(call.log, domain), user, call.request.secret, computer};
+  LogonRequest logon{domain, ControllersToTry(call.log, domain, LoadState().preferredDomainControllers), user,
+                     call.request.secret, computer};
   const Inspection found = Inspect(call.log, logon, call.request.Text("organizationalUnit"));
   call.log.Run("account", "looking for a computer account " + computer, [&] {
     CheckAccount(found, HostDnsName(computer, domain), call.settings);

@@ -18,12 +18,7 @@ namespace {
 // still has the computer account.
 bool CheckCredentials(const Call& call, const State& state, const std::string& user) {
   if (SplitAccountName(user).user.empty()) throw Failure(kInvalidAccountName, "the user name is empty");
-  std::vector<std::string> controllers = state.preferredDomainControllers;
-  call.log.Run("locate", "asking DNS for the controllers of " + state.dnsDomain, [&] {
-    const std::vector<std::string> found = LocateControllers(state.dnsDomain);
-    controllers.insert(controllers.end(), found.begin(), found.end());
-    return std::to_string(found.size()) + " known";
-  });
+  const auto controllers = ControllersToTry(call.log, state.dnsDomain, state.preferredDomainControllers);
   return !Inspect(call.log, {state.dnsDomain, controllers, user, call.request.secret, state.hostName}, "")
               .accountDn.empty();
 }

@@ -59,14 +59,12 @@ std::string ForgetJoin() {
 
 // Only the one where it was made is sure to know the account; the others may, should that one have gone.
 std::vector<std::string> ControllersOfAccount(const Journal& journal) {
-  std::vector<std::string> controllers = {journal.accountMadeAt};
   try {
-    const std::vector<std::string> others = LocateControllers(journal.dnsDomain);
-    controllers.insert(controllers.end(), others.begin(), others.end());
+    return ControllersInTurn({journal.accountMadeAt}, LocateControllers(journal.dnsDomain));
   } catch (const Failure&) {
-    // The first one is reached without the SRV records.
+    // That one is reached without the SRV records.
+    return {journal.accountMadeAt};
   }
-  return controllers;
 }
 
 void RestoreService() {
