@@ -2,6 +2,7 @@
 #include <sys/stat.h>
 
 #include <cstring>
+#include <stdexcept>
 #include <vector>
 
 #include "authentication/authentication.h"
@@ -22,6 +23,18 @@ namespace {
 constexpr const char* server = "10.0.0.1";
 constexpr const char* optionPath = "UserVars.ActiveDirectoryVerifyCAMCertificate";
 constexpr const char* database = "/var/lib/quenix/configstore.db";
+
+/// Makes every step fail that comes before a server is asked.
+class NothingCanBeRead {
+ public:
+  NothingCanBeRead() {
+    WriteFile("/etc/quenix/options.conf", "this is no option\n");
+    RemoveFile(CAMPROVIDER_CONF);
+  }
+
+ private:
+  TakeOver<int(char*, std::size_t)> hostName_{calls::gethostname, [](auto...) { return -1; }};
+};
 
 /// A host "host1" that resolves to host1.corp.example, with both plug-ins.
 class CAMJoinTest : public testing::Test {
@@ -60,15 +73,23 @@ std::vector<std::string> ErrorsLogged() {
 }  // namespace
 
 TEST_F(CAMJoinTest, HostNameInsteadOfAnAddressIsRefusedBeforeAnythingIsRead) {
-  RemoveFile(CAMPROVIDER_CONF);
   ActiveDirectoryStore store(1);
+  const NothingCanBeRead obstacle;
   EXPECT_THROW_WHAT(
       store.JoinDomainWithCAM("cam.corp.example", "", true), InvalidIPAddressException,
       "The IP Address is invalid: IPv4 address 'cam.corp.example' cannot be parsed as an IP address");
 }
 
-TEST_F(CAMJoinTest, Ipv6AddressIsRefused) {
+TEST_F(CAMJoinTest, Ipv6AddressIsRefusedBeforeAnythingIsRead) {
   ActiveDirectoryStore store(1);
+  const NothingCanBeRead obstacle;
+  EXPECT_THROW(store.JoinDomainWithCAM("::1", "", true), InvalidIPAddressException);
+}
+
+TEST_F(CAMJoinTest, DiscoveryTakesNoHostNameAndNoIpv6Address) {
+  ActiveDirectoryStore store(1);
+  const NothingCanBeRead obstacle;
+  EXPECT_THROW(store.GetDomainForCAMService("cam.corp.example"), InvalidIPAddressException);
   EXPECT_THROW(store.GetDomainForCAMService("::1"), InvalidIPAddressException);
 }
 
@@ -169,6 +190,13 @@ TEST_F(CAMJoinTest, MissingThumbprintIsLoggedAndNamesItsRecord) {
                                      "get the requested object"});
 }
 
+TEST_F(CAMJoinTest, ProviderIsLookedUpBeforeTheThumbprint) {
+  VerifyCertificate(1);
+  RemoveFile(CAMPROVIDER_CONF);
+  EXPECT_THROW(Join(), InvalidCAMProxyProviderException);
+  EXPECT_EQ(ErrorsLogged(), std::vector<std::string>{});
+}
+
 TEST_F(CAMJoinTest, MissingPluginIsAnIOError) {
   ConfigureCamProvider("absent");
   EXPECT_THROW(Join(), IOError);
@@ -186,6 +214,12 @@ TEST_F(CAMJoinTest, FailedHostNameCheckCreatesNoAccount) {
   WriteFile("/etc/hosts", "127.0.0.1 localhost\n");
   EXPECT_THROW(Join("", false), InvalidHostNameException);
   EXPECT_EQ(cam_.creations, 0);
+}
+
+TEST_F(CAMJoinTest, SkippedHostNameCheckTakesAnyName) {
+  SetHostName("localhost");
+  WriteFile("/etc/hosts", "127.0.0.1 localhost\n");
+  EXPECT_NO_THROW(Join("", true));
 }
 
 TEST_F(CAMJoinTest, AccountIsAskedForWithTheFullNameAndTheContainer) {
@@ -265,6 +299,18 @@ TEST_F(CAMJoinTest, FailedJoinIsNotRecorded) {
   EXPECT_THROW(ActiveDirectoryConfigStore().GetDomainName(), ConfigurationError);
 }
 
+TEST_F(CAMJoinTest, PluginIsClosedWhenTheJoinFails) {
+  provider_.joinDomainWithMachineAccount = [](auto...) { return 5U; };
+  ActiveDirectoryStore store(1);
+  int closed = 0;
+  const TakeOver<int(void*)> watch(calls::dlclose, [&closed](void* handle) {
+    ++closed;
+    return calls::dlclose.Real(handle);
+  });
+  EXPECT_THROW(store.JoinDomainWithCAM(server, "", true), AccessDeniedException);
+  EXPECT_EQ(closed, 1);
+}
+
 TEST_F(CAMJoinTest, UnrecordedJoinIsLoggedAndUndoneAndTheStoresExceptionGoesOut) {
   BreakConfigurationStore();
   int leaves = 0;
@@ -285,6 +331,17 @@ TEST_F(CAMJoinTest, UnrecordedJoinIsLoggedAndUndoneAndTheStoresExceptionGoesOut)
   EXPECT_TRUE(withoutAccount);
   EXPECT_EQ(ErrorsLogged(), std::vector<std::string>{"Failed to store domain details to Config Store: " +
                                                      text + ".Leaving Domain..."});
+}
+
+TEST_F(CAMJoinTest, ExceptionOfAnyOtherClassUndoesTheJoinToo) {
+  int leaves = 0;
+  provider_.partDomain = [&leaves](auto...) {
+    ++leaves;
+    return 0U;
+  };
+  const TakeOver<int(int)> fail(calls::fsync, [](int) -> int { throw std::runtime_error("no disk"); });
+  EXPECT_THROW_WHAT(Join(), std::runtime_error, "no disk");
+  EXPECT_EQ(leaves, 1);
 }
 
 TEST_F(CAMJoinTest, ExceptionOfTheLeaveGoesOutInstead) {

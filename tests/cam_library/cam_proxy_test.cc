@@ -147,6 +147,13 @@ TEST(CAMProxyTest, CreationFillsTheSecondAndThirdField) {
   EXPECT_EQ(principal.joinBlob, "blob");
 }
 
+TEST(CAMProxyTest, BothResultsOfACreationAreReleasedOnce) {
+  CamScript& script = UseScriptedCamPlugin();
+  OpenScripted().CreateMachineAccount("host1.corp.example", "OU=Hosts");
+  std::sort(script.released.begin(), script.released.end());
+  EXPECT_EQ(script.released, (std::vector<std::string>{"HOST1$", "blob"}));
+}
+
 TEST(CAMProxyTest, WrongCertificateHasAClassOfItsOwnFromBothOperations) {
   WithStatus(0x80090325, [](const CAMProxy& proxy) {
     EXPECT_THROW_WHAT(proxy.GetDomainSID(), InvalidCAMCertificateException,

@@ -13,6 +13,7 @@
 #include "cam/plugin.h"
 #include "cam/tls_server.h"
 #include "prepared_host.h"
+#include "process_memory.h"
 #include "terminal_session.h"
 
 namespace velmorctltest {
@@ -29,7 +30,12 @@ using testsupport::ReadFile;
 using testsupport::WriteFile;
 
 const std::string OPTION = "UserVars.ActiveDirectoryVerifyCAMCertificate";
-const std::string JOIN_CALL = "joinDomainWithMachineAccount corp.example CORP sandbox HOST2$ (8 characters)";
+std::string JoinCallWith(std::size_t blobSize) {
+  return "joinDomainWithMachineAccount corp.example CORP sandbox HOST2$ (" + std::to_string(blobSize) +
+         " characters)";
+}
+
+const std::string JOIN_CALL = JoinCallWith(8);
 
 /// A service that knows the domain, and answers creations with `answer`.
 camtest::Conversation ServiceWithCreation(const std::string& answer) {
@@ -259,6 +265,26 @@ TEST_F(CamCommandTest, JoinHandsTheAccountToTheProvider) {
   EXPECT_TRUE(Called(JOIN_CALL));
   EXPECT_EQ(ActiveStore(), "Active Directory");
   EXPECT_EQ(Shown()["joinedThrough"], LOOPBACK);
+}
+
+TEST_F(CamCommandTest, TextForTheJoinIsWipedFromMemoryAfterTheJoin) {
+  std::string blob;
+  while (blob.size() < 400) {
+    blob += "QmxvYg" + std::to_string(blob.size());
+  }
+  TlsServer other(
+      identity_, ServiceWithCreation(
+                     HttpAnswer("201 Created", R"({"accountName": "HOST2$", "joinBlob": ")" + blob + "\"}")));
+  camtest::WriteSettings(other.Port());
+  Trust();
+  Script("hang.joinDomainWithMachineAccount", "");
+  Script("hang.getDomainTrustState", "");
+  RunningProgram join({"join", "--proxy", LOOPBACK, "--skip-hostname-check"});
+  ASSERT_TRUE(Eventually([&blob] { return Called(JoinCallWith(blob.size())); }));
+  ASSERT_TRUE(MemoryHolds(join.Process(), blob.substr(200, 100)));
+  RemoveScript("hang.joinDomainWithMachineAccount");
+  ASSERT_TRUE(Eventually([] { return Called("getDomainTrustState"); }));
+  EXPECT_FALSE(MemoryHolds(join.Process(), blob.substr(200, 100)));
 }
 
 TEST_F(CamCommandTest, JoinAsksForThatContainer) {

@@ -4,9 +4,9 @@
 #include <csignal>
 #include <fstream>
 #include <iterator>
-#include <sstream>
 
 #include "prepared_host.h"
+#include "process_memory.h"
 #include "terminal_session.h"
 
 namespace velmorctltest {
@@ -25,31 +25,6 @@ std::vector<std::string> JoinWith(std::vector<std::string> source) {
 std::string Raw(const std::string& path) {
   std::ifstream stream(path, std::ios::binary);
   return std::string(std::istreambuf_iterator<char>(stream), {});
-}
-
-/// Whether the text stands anywhere in the writable memory of the process.
-bool MemoryHolds(pid_t process, const std::string& text) {
-  constexpr std::uint64_t greatestRegion = 64U << 20;  // A sanitizer's shadow is greater, and has no text.
-  std::istringstream maps(Raw("/proc/" + std::to_string(process) + "/maps"));
-  std::ifstream memory("/proc/" + std::to_string(process) + "/mem", std::ios::binary);
-  for (std::string line; std::getline(maps, line);) {
-    std::uint64_t begin = 0;
-    std::uint64_t end = 0;
-    char dash = 0;
-    std::string permissions;
-    std::istringstream(line) >> std::hex >> begin >> dash >> end >> permissions;
-    if (permissions.compare(0, 2, "rw") != 0 || end - begin > greatestRegion) {
-      continue;
-    }
-    std::string content(end - begin, '\0');
-    memory.clear();
-    memory.seekg(static_cast<std::streamoff>(begin));
-    memory.read(content.data(), static_cast<std::streamsize>(content.size()));
-    if (content.find(text) != std::string::npos) {
-      return true;
-    }
-  }
-  return false;
 }
 
 class PasswordTest : public PreparedHost {
