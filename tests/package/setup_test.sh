@@ -25,7 +25,7 @@ touch smbd.service winbind.service
 [ $how != is_interrupted ] || kill -TERM \$PPID
 exit 100
 PROGRAM
-install -m 755 /dev/stdin systemctl <<'PROGRAM'
+install -m 755 /dev/stdin update-rc.d <<'PROGRAM'
 #!/bin/sh
 echo "$@" >>/run/calls
 PROGRAM
@@ -35,5 +35,5 @@ PATH=/run/stand-ins:$PATH /run/project/setup >/run/output 2>&1 || status=$?
 if [[ $how == is_interrupted ]]; then expected=130; else expected=1; fi
 [[ $status == "$expected" ]] || { echo "it ends with $status"; cat /run/output; exit 1; }
 touch /run/calls
-[[ $(cat /run/calls) == $'disable smbd\ndisable winbind' ]] || { echo "called: $(cat /run/calls)"; exit 1; }
+[[ $(cat /run/calls) == $'smbd disable\nwinbind disable' ]] || { echo "called: $(cat /run/calls)"; exit 1; }
 [[ ! -e /usr/sbin/policy-rc.d ]] || { echo "services cannot be started any more"; exit 1; }
