@@ -21,7 +21,16 @@ NO_HTTP = [b"GET\r\n\r\n", b"GET /v1/domain HTTP/9.9\r\n\r\n",
            b"GET /" + b"a" * 100000 + b" HTTP/1.1\r\nHost: a\r\n\r\n"]
 
 
-class ServerTest(ServiceTest):
+class ServerTestCase(ServiceTest):
+
+    def assert_broken_off(self):
+        wait_until(self.service.audit)
+        event = self.service.audit()[0]
+        self.assertEqual((event["client"], event["request"], event["text"]),
+                         ("127.0.0.1", "POST /v1/computers", "the request did not come whole"))
+
+
+class ServerTest(ServerTestCase):
 
     def assert_serving(self):
         self.assertEqual(self.service.domain().code, 200)
@@ -87,6 +96,7 @@ class ServerTest(ServiceTest):
             with self.assertRaises((ssl.SSLError, OSError)):
                 for _ in range(10000):
                     connection.sendall(b"1000\r\n" + b"x" * 4096 + b"\r\n")
+        self.assert_broken_off()
         self.assert_serving()
 
     def testUnknownPathIsRefused(self):
@@ -113,7 +123,7 @@ class ServerTest(ServiceTest):
                 self.assertEqual(status_of_next(connection), 200)
 
 
-class ImpatientServerTest(ServiceTest):
+class ImpatientServerTest(ServerTestCase):
     """Clients that take too long, which is seen soon."""
 
     CHANGES = {"server": {"request-timeout-seconds": 2}}
@@ -131,6 +141,7 @@ class ImpatientServerTest(ServiceTest):
         with connect() as connection:
             connection.sendall(b"POST /v1/computers HTTP/1.1\r\nHost: a\r\nContent-Length: 1000\r\n\r\n{")
             self.assertTrue(is_closed(connection))
+        self.assert_broken_off()
 
     def testConnectionWithoutHandshakeIsCutOff(self):
         with socket.create_connection(("127.0.0.1", PORT), timeout=20) as connection:

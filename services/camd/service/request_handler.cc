@@ -73,10 +73,11 @@ void RequestHandler::Handle(WebRequest request, Completion completion) {
   Route(task);
 }
 
-void RequestHandler::NoteUndelivered(const Address& client, const std::string& request) {
-  audit_.Write({{"client", client.Text()},
-                {"request", request.substr(0, kLongestLoggedPath)},
-                {"text", "the client did not wait for the answer"}});
+void RequestHandler::NoteBrokenOff(const Address& client, const std::string& request, bool whole) {
+  audit_.Write(
+      {{"client", client.Text()},
+       {"request", request.substr(0, kLongestLoggedPath)},
+       {"text", whole ? "the client did not wait for the answer" : "the request did not come whole"}});
 }
 
 // What is looked at before the request itself.

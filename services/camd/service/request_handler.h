@@ -40,8 +40,8 @@ class RequestHandler {
   // Does not wait for the directory. Writes one line to the audit log.
   void Handle(WebRequest request, Completion completion);
 
-  // Notes that the client did not wait for its answer.
-  void NoteUndelivered(const Address& client, const std::string& request);
+  // Notes that the client did not wait for its answer, or that its request did not come whole.
+  void NoteBrokenOff(const Address& client, const std::string& request, bool whole);
 
  private:
   std::optional<WebAnswer> Refusal(const WebRequest& request, const AccessSettings& access);

@@ -300,7 +300,7 @@ int WebServer::Send(MHD_Connection* connection, Exchange& exchange) {
 
 void WebServer::End(Exchange* exchange, bool delivered) {
   const bool handedOver = exchange->handedOver;
-  if (handedOver && !delivered) handler_.NoteUndelivered(exchange->client, exchange->label);
+  if (!delivered) handler_.NoteBrokenOff(exchange->client, exchange->label, handedOver);
   watch_.Start(exchange->socket);
   delete exchange;
   if (!handedOver) return;
