@@ -93,7 +93,7 @@ void AddDomainRows(Rows& rows, const Status& status) {
   std::string unit = status.joinRecord ? status.joinRecord->organizationalUnit : "";
   std::string controller = status.domainController.value_or("");
   rows.push_back({"Domain:", DomainText(status)});
-  rows.push_back({"Organizational unit:", unit.empty() ? "the directory's default" : unit});
+  rows.push_back({"Organizational unit:", unit.empty() ? "none named at the join" : unit});
   rows.push_back({"Machine account:", Marked(configuration.machineAccountDN, status.configuration.live)});
   rows.push_back({"Domain controller:", Marked(controller, status.domainController.has_value())});
   rows.push_back({"Preferred controllers:", preferred.empty() ? "none" : Join(preferredNames, ", ")});
