@@ -1,9 +1,13 @@
-// How winbindd is started and stopped on a host where systemd runs, with a script in systemctl's place.
+// How winbindd is started and stopped on a host where systemd runs, with a script in systemctl's place, and
+// what is put into Samba's own cache for it.
 
 #include "helper/winbind_service.h"
 
 #include <gtest/gtest.h>
 
+#include <chrono>
+
+#include "common/child.h"
 #include "expect_failure.h"
 #include "systemctl_script.h"
 
@@ -47,6 +51,15 @@ TEST(WinbindThroughSystemdTest, ItRunsWhenItsUnitIsActive) {
 TEST(WinbindThroughSystemdTest, ItDoesNotRunWhenItsUnitIsInactive) {
   ReplaceSystemctl("exit 3");
   EXPECT_FALSE(winbind_service::IsRunning());
+}
+
+TEST(WinbindCacheTest, TheControllerToBeginWithIsThereUnderEachName) {
+  winbind_service::BeginWith("dc3.corp.example", {"CORP", "corp.example"});
+  for (const char* key : {"SAFJOIN/DOMAIN/CORP", "SAFJOIN/DOMAIN/CORP.EXAMPLE"}) {
+    const ProgramResult found =
+        RunProgram({"/usr/bin/net", "cache", "get", key}, ProgramOutput::kWanted, std::chrono::seconds(20));
+    EXPECT_NE(found.output.find("Value: dc3.corp.example"), std::string::npos) << found.output;
+  }
 }
 
 }  // namespace

@@ -12,6 +12,7 @@
 #include "helper/netapi.h"
 #include "helper/operations.h"
 #include "helper/precheck.h"
+#include "helper/preferred_controllers.h"
 #include "helper/undo.h"
 #include "helper/winbind_service.h"
 
@@ -67,7 +68,7 @@ class Membership {
     call_.log.Run("configure", "writing smb.conf for " + state_.netbiosDomain, [&] {
       winbind_service::Stop();
       // Samba remembers for a while which controllers did not answer, also those that do now.
-      winbind_service::FlushCache();
+      ForgetUsedControllers(state_);
       WriteSmbConf(FormatSmbConf(state_, call_.settings, KeytabUse::kDuringJoin));
       return "written";
     });

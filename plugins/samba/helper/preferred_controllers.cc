@@ -14,8 +14,15 @@ void ApplyPreferredControllers(const State& state, const Settings& settings) {
   RequireSmbConfIsReplaceable();
   winbind_service::Stop();
   WriteSmbConf(FormatSmbConf(state, settings, KeytabUse::kKept));
-  winbind_service::FlushCache();
+  ForgetUsedControllers(state);
   winbind_service::Start();
+}
+
+void ForgetUsedControllers(const State& state) {
+  winbind_service::FlushCache();
+  if (state.preferredDomainControllers.empty()) return;
+  winbind_service::BeginWith(state.preferredDomainControllers.front(),
+                             {state.netbiosDomain, state.dnsDomain});
 }
 
 std::string PreferControllers(const Call& call) {

@@ -13,6 +13,10 @@ namespace sambaprovider {
 /// administrator's, which is left as it is.
 void ApplyPreferredControllers(const State& state, const Settings& settings);
 
+/// Has Samba forget which controllers it has used, and begin with the first preferred one, if there is one.
+/// Call it while winbindd is stopped. Throws Failure.
+void ForgetUsedControllers(const State& state);
+
 }  // namespace sambaprovider
 
 #endif  // SAMBA_HELPER_PREFERRED_CONTROLLERS_H

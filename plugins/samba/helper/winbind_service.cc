@@ -20,6 +20,7 @@ extern "C" {  // which these headers lack
 
 #include "common/child.h"
 #include "common/files.h"
+#include "common/names.h"
 #include "common/status.h"
 #include "velmor/unique_fd.h"
 
@@ -63,6 +64,14 @@ Process RunningProcess() {
   const std::string name = ReadFile("/proc/" + std::to_string(process.number) + "/comm").value_or("");
   if (name.rfind("winbindd", 0) != 0) return {};
   return process;
+}
+
+void NetCache(const std::vector<std::string>& arguments) {
+  std::vector<std::string> command = {"/usr/bin/net", "cache"};
+  command.insert(command.end(), arguments.begin(), arguments.end());
+  const ProgramResult result = RunProgram(command, ProgramOutput::kWanted, kStopTime);
+  if (result.exitStatus != 0)
+    throw Failure(kInternalError, "net cache " + arguments.front() + " failed: " + LastLine(result.output));
 }
 
 bool Answers() {
@@ -154,10 +163,14 @@ void Stop() {
 }
 
 void FlushCache() {
-  const ProgramResult result =
-      RunProgram({"/usr/bin/net", "cache", "flush"}, ProgramOutput::kWanted, kStopTime);
-  if (result.exitStatus != 0)
-    throw Failure(kInternalError, "net cache flush failed: " + LastLine(result.output));
+  NetCache({"flush"});
+}
+
+void BeginWith(const std::string& controller, const std::vector<std::string>& domainNames) {
+  for (const std::string& name : domainNames) {
+    // Where Samba keeps the controller at which a host was joined. It comes before all others until it fails.
+    NetCache({"add", "SAFJOIN/DOMAIN/" + UpperCase(name), controller, "52w"});
+  }
 }
 
 }  // namespace sambaprovider::winbind_service
