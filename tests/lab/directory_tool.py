@@ -1,7 +1,7 @@
 #!/usr/bin/python3
 """Looks at and changes the directory from the controller itself, for the tests. Prints its answer as JSON.
 
-usage: directory_tool.py QUESTION ARGUMENT...        (inside dc1)
+usage: directory_tool.py QUESTION ARGUMENT...        (inside the controller)
 """
 import json
 import secrets

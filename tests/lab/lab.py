@@ -162,13 +162,15 @@ class Host:
 
 
 class Directory:
-    """CORP.EXAMPLE as its controller dc1 sees it, past all network protocols."""
+    """CORP.EXAMPLE as one of its controllers sees it, past all network protocols."""
 
-    def __init__(self, lab):
+    def __init__(self, lab, controller="dc1"):
         self.lab = lab
+        self.controller = controller
 
     def _ask(self, *arguments):
-        done = self.lab.enter("dc1", "/usr/bin/python3", "-B", SOURCE / "tests/lab/directory_tool.py", *arguments)
+        done = self.lab.enter(self.controller, "/usr/bin/python3", "-B", SOURCE / "tests/lab/directory_tool.py",
+                              *arguments)
         assert done.returncode == 0, f"{arguments}: {done.stderr}"
         return json.loads(done.stdout)
 
@@ -200,7 +202,7 @@ class Directory:
 
     def refused_attempts(self, user):
         """How many log-ons as this user the controller has refused since it was started."""
-        log = self.lab.enter("dc1", "cat", "/var/log/samba/log.samba").stdout
+        log = self.lab.enter(self.controller, "cat", "/var/log/samba/log.samba").stdout
         refused = 0
         for line in log.splitlines():
             text = line.strip()
