@@ -61,7 +61,7 @@ class JoinTest(LabTest):
     def testProgressIsToldWithTheProvidersRecord(self):
         done = self.host.join()
         self.assert_exit(done, 0)
-        self.assertIn("corp.example", done.stderr)
+        self.assertRegex(done.stderr, r"(?m)^\[ *\d+\.\d s\] samba: keytab: made /etc/krb5\.keytab$")
 
     def testStepsAreRecordedUpToTheResult(self):
         self.host.must_join()

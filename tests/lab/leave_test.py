@@ -1,4 +1,6 @@
 """Leaving a real domain."""
+import json
+
 from lab import ADMINISTRATOR_PASSWORD, LabTest
 
 
@@ -28,7 +30,7 @@ class LeaveTest(LabTest):
         self.host.must_join()
         self.assert_exit(self.leave_with_account(), 0)
         status, exit_status = self.host.status()
-        self.assertEqual((exit_status, status["joined"]), (3, False))
+        self.assertEqual((exit_status, status["recordedDomain"]), (3, None))
 
     def testLeaveWithAWrongPasswordKeepsTheMembership(self):
         self.host.must_join()
@@ -39,6 +41,13 @@ class LeaveTest(LabTest):
         self.host.must_join()
         self.assert_exit(self.host.velmorctl("leave"), 0)
         self.assertFalse(self.host.has("/etc/krb5.keytab"))
+
+    def testLeaveForgetsThePreferredControllers(self):
+        self.host.must_join()
+        self.assert_exit(self.host.velmorctl("dc", "prefer", "dc1.corp.example"), 0)
+        self.assert_exit(self.host.velmorctl("leave"), 0)
+        state = json.loads(self.host.read("/var/lib/quenix/samba/state.json"))
+        self.assertEqual(state["preferredDomainControllers"], [])
 
     def testLeaveOfAHostThatIsNoMemberSaysSo(self):
         self.assert_exit(self.host.velmorctl("leave"), 3)

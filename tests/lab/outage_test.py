@@ -8,7 +8,7 @@ import time
 
 from lab import ADMINISTRATOR_PASSWORD, Directory, Host, Lab, unittest
 
-HEALTHY, TIMED_OUT = "1", "2"
+HEALTHY, TIMED_OUT, NO_CONTROLLER = "1", "2", "5"
 STORE_TIMEOUT = 3
 # How much later than its time-out an answer may come on a machine that is busy with other things.
 LATE = 4
@@ -126,9 +126,8 @@ class UnpluggedControllerTest(Outage):
                 cls.lab.command("link", "dc1", "up")
             cls.seconds_to_recover = store.ask_until("trust-state", HEALTHY, 120)
 
-    def testTrustIsNotHealthyMeanwhile(self):
-        self.assertEqual(self.state_before.text, HEALTHY)
-        self.assertNotEqual(self.state_in_outage.text, HEALTHY)
+    def testTrustStateSaysMeanwhileThatNoControllerAnswers(self):
+        self.assertEqual((self.state_before.text, self.state_in_outage.text), (HEALTHY, NO_CONTROLLER))
 
     def testUnknownTrustedDomainsAreNotCalledNone(self):
         self.assert_exit(self.list_in_outage, 8)

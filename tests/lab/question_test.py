@@ -39,11 +39,18 @@ class StatusTest(LabTest):
     def relationship(self, domain):
         return json.loads(self.host.must("velmorctl", "trust", "show", domain, "--json"))["relationship"]
 
-    def testPreferredControllerIsRememberedAndUsed(self):
+    def testPreferredControllersAreRememberedInTheirOrder(self):
         self.host.must_join()
-        self.assert_exit(self.host.velmorctl("dc", "prefer", "dc1.corp.example"), 0)
-        self.assertIn("dc1.corp.example", self.host.must("velmorctl", "dc", "show"))
-        self.host.must("wbinfo", "--check-secret")
+        names = ["dc9.corp.example", "dc1.corp.example"]
+        self.assert_exit(self.host.velmorctl("dc", "prefer", *names), 0)
+        shown = json.loads(self.host.must("velmorctl", "dc", "show", "--json"))
+        self.assertEqual(shown["preferredDomainControllers"], names)
+
+    def testPreferredControllerThatIsNotThereIsPassedOver(self):
+        self.host.must_join()
+        self.assert_exit(self.host.velmorctl("dc", "prefer", "dc9.corp.example"), 0)
+        self.assertIn("dc9.corp.example", self.host.read("/etc/samba/smb.conf"))
+        self.host.must("wbinfo", "--ping-dc")
 
 
 class TrustStateTest(LabTest):
