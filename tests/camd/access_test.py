@@ -142,6 +142,13 @@ class TokenTest(ServiceTest):
         self.service.behave()
         self.assertEqual(self.service.create(token=token).code, 201)
 
+    def testTokenIsNotUsedUpWhenTheLedgerFails(self):
+        token = self.service.token()
+        self.service.change_ledger("CREATE TRIGGER full BEFORE INSERT ON accounts BEGIN SELECT RAISE(FAIL, 'full'); END")
+        self.assertEqual(self.service.create(token=token).outcome, (500, 1359))
+        self.service.change_ledger("DROP TRIGGER full")
+        self.assertEqual(self.service.create(token=token).code, 201)
+
     def testTwoCreationsAtOnceWithOneTokenGiveOneAccount(self):
         token = self.service.token()
         self.service.behave(delay=0.5)

@@ -75,17 +75,18 @@ std::optional<WebAnswer> AccountCreation::Check(Task& task, Order& order) {
 WebAnswer AccountCreation::Carry(const Task& task, Order&& handedOver) {
   const Order order = std::move(handedOver);
   const int64_t now = time(nullptr);
-  if (!order.tokenId.empty() && !tokens_.Claim(order.tokenId, order.hostName, now)) {
-    return FailureAnswer(401, kLogonFailure, "the token has been used");
-  }
   const AccountRequest request = {order.computer, order.hostName, order.container,
                                   task.request.client.Client().Text(), order.tokenId};
   const auto id =
       ledger_.Begin(request, now, now - kSecondsPerDay, task.configuration->access.accountsPerDay);
   if (!id) {
-    if (!order.tokenId.empty()) tokens_.Release(order.tokenId);
     return FailureAnswer(429, kQuotaExceeded, "this client has had its accounts for the day",
                          kRetryQuotaSeconds);
+  }
+  // Behind what may fail before the creation begins, so that no token is used up for nothing.
+  if (!order.tokenId.empty() && !tokens_.Claim(order.tokenId, order.hostName, now)) {
+    ledger_.Fail(*id, kLogonFailure, now);
+    return FailureAnswer(401, kLogonFailure, "the token has been used");
   }
   return CarryEntered(task, order, *id);
 }
