@@ -1,5 +1,6 @@
 #include "https_exchange.h"
 
+#include <openssl/err.h>
 #include <sys/socket.h>
 
 #include <algorithm>
@@ -39,7 +40,8 @@ using Body = http::basic_string_body<char, std::char_traits<char>, WipingAllocat
 using Fields = http::basic_fields<WipingAllocator<char>>;
 using Stream = beast::ssl_stream<beast::tcp_stream>;
 
-std::uint32_t StatusOf(const error_code& error) {
+/// `tlsStatus` is that of a fault of TLS itself, which means something else once the handshake is done.
+std::uint32_t StatusOf(const error_code& error, std::uint32_t tlsStatus) {
   if (error == beast::error::timeout || error == asio::error::timed_out) return TIMED_OUT;
   if (error == asio::error::connection_refused) return CONNECTION_REFUSED;
   if (error == asio::error::host_unreachable || error == asio::error::network_unreachable ||
@@ -53,12 +55,16 @@ std::uint32_t StatusOf(const error_code& error) {
     return CONNECTION_BROKEN;
   }
   if (error.category() == http::make_error_code(http::error::bad_version).category()) return INVALID_DATA;
-  if (error.category() == asio::error::get_ssl_category()) return NO_COMMON_TLS;
+  if (error.category() == asio::error::get_ssl_category()) {
+    const bool lacksMemory =
+        ERR_GET_REASON(static_cast<unsigned long>(error.value())) == ERR_R_MALLOC_FAILURE;
+    return lacksMemory ? OUT_OF_MEMORY : tlsStatus;
+  }
   return UNEXPECTED_NETWORK_ERROR;
 }
 
-void ThrowIfFailed(const char* step, const error_code& error) {
-  if (error) throw Failure(StatusOf(error), std::string(step) + ": " + error.message());
+void ThrowIfFailed(const char* step, const error_code& error, std::uint32_t tlsStatus = CONNECTION_BROKEN) {
+  if (error) throw Failure(StatusOf(error, tlsStatus), std::string(step) + ": " + error.message());
 }
 
 asio::ssl::context MakeContext(CertificateCheck* check) {
@@ -136,7 +142,7 @@ class Connection {
     const error_code error =
         Await([&](auto done) { stream_.async_handshake(asio::ssl::stream_base::client, std::move(done)); });
     if (check_ != nullptr) check_->ThrowIfRefused();
-    ThrowIfFailed("TLS handshake", error);
+    ThrowIfFailed("TLS handshake", error, NO_COMMON_TLS);
     if (check_ != nullptr) check_->ThrowUnlessAccepted();
   }
 
@@ -195,7 +201,7 @@ Answer Exchange(const Target& target, CertificateCheck* check, const Request& re
     connection.Send(Serialise(target, request));
     return connection.Receive();
   } catch (const boost::system::system_error& error) {
-    throw Failure(StatusOf(error.code()), error.what());
+    throw Failure(StatusOf(error.code(), NO_COMMON_TLS), error.what());
   }
 }
 

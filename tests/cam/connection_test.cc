@@ -103,6 +103,16 @@ TEST(CamConnectionTest, ServerThatDiesInTheMiddleIsABrokenConnection) {
   EXPECT_EQ(StatusAt(server.Port(), ""), CONNECTION_BROKEN);
 }
 
+TEST(CamConnectionTest, AnswerThatIsNoTlsIsABrokenConnection) {
+  TlsServer server(Identity(), [](Connection& connection) {
+    connection.ReadRequest();
+    const std::string garbage = "this is no record of TLS";
+    send(connection.Descriptor(), garbage.data(), garbage.size(), MSG_NOSIGNAL);
+    connection.AwaitEnd();
+  });
+  EXPECT_EQ(StatusAt(server.Port(), ""), CONNECTION_BROKEN);
+}
+
 TEST(CamConnectionTest, ServerThatHangsUpInTheHandshakeIsABrokenConnection) {
   std::uint16_t port = 0;
   const int listener = ListenOnly(&port, 1);
