@@ -166,6 +166,15 @@ TEST_F(CamCommandTest, TrustThatIsNotConfirmedStoresNothing) {
   EXPECT_TRUE(Shown()["certificate"].is_null());
 }
 
+TEST_F(CamCommandTest, TrustLeavesNoTokenInMemory) {
+  camtest::WriteSettings(server_.Port(), "token = \"Zm9yIG9uZSBjcmVhdGlvbiBhbmQgbm8gb3RoZXI\"\n");
+  TerminalSession session({"cam", "trust", LOOPBACK});
+  ASSERT_TRUE(session.AwaitText("Trust this certificate? [yes/no] "));
+  EXPECT_FALSE(MemoryHolds(session.Process(), "BhbmQgbm8gb3RoZXI"));
+  session.Type("no\n");
+  session.Wait();
+}
+
 TEST_F(CamCommandTest, TrustKeepsTheOtherSettingsAndTheMode) {
   camtest::WriteSettings(server_.Port(), "token = \"Zm9yIG9uZSBjcmVhdGlvbg\"\nsha256-127.0.0.1 = AB\n");
   EXPECT_EQ(Trust().exitCode, 0);

@@ -26,6 +26,8 @@ class TerminalSession {
   /// Presses keys.
   void Type(const std::string& keys) const;
 
+  pid_t Process() const { return process_; }
+
   /// Whether the terminal shows what is typed.
   bool Echoes() const;
 

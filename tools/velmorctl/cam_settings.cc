@@ -45,9 +45,12 @@ bool FileExists() {
   return std::filesystem::exists(camSettingsFile, error) || error;
 }
 
-/// Makes room at once, so that no copy of the token stays behind in memory that was given back.
+/// Makes room at once and reads past the stream's own buffer, so that no copy of the token stays behind in
+/// memory that was given back.
 std::string ReadWholeFile() {
-  std::ifstream stream(camSettingsFile, std::ios::binary);
+  std::ifstream stream;
+  stream.rdbuf()->pubsetbuf(nullptr, 0);
+  stream.open(camSettingsFile, std::ios::binary);
   if (!stream) {
     int errorNumber = errno;
     Failure failure = Fault(SystemErrorText(errorNumber));

@@ -25,7 +25,7 @@ class Situation {
   /// Whether the CAM service is asked: then its statuses count, unless the provider gave a reason of its own.
   bool throughProxy = false;
 
-  /// Remembers the file's content, so that Changes() can tell whether the command changed it. Files of more
+  /// Remembers a digest of the file, so that Changes() can tell whether the command changed it. Files of more
   /// than a mebibyte are not looked at.
   void Watch(const std::string& file);
 
@@ -41,7 +41,7 @@ class Situation {
  private:
   struct WatchedFile {
     std::string file;
-    std::optional<std::string> content;
+    std::optional<std::string> digest;
   };
   std::vector<WatchedFile> files_;
   std::vector<std::string> changes_;
