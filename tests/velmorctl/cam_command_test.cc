@@ -128,6 +128,18 @@ TEST_F(CamCommandTest, TrustRefusesAFileWithoutACertificate) {
       << outcome.errors;
 }
 
+TEST_F(CamCommandTest, TrustAsksForNoPassPhrase) {
+  WriteFile("/run/encrypted.pem",
+            "-----BEGIN CERTIFICATE-----\nProc-Type: 4,ENCRYPTED\n"
+            "DEK-Info: AES-128-CBC,000102030405060708090A0B0C0D0E0F\n\nMDAwMDAwMDAwMDAwMDAwMA==\n"
+            "-----END CERTIFICATE-----\n");
+  TerminalSession session({"cam", "trust", "/run/encrypted.pem"});
+  session.Type("phrase\n");
+  const Outcome outcome = session.Wait();
+  EXPECT_EQ(outcome.exitCode, 12);
+  EXPECT_EQ(outcome.output.find("pass phrase"), std::string::npos) << outcome.output;
+}
+
 TEST_F(CamCommandTest, TrustNeedsRoot) {
   EXPECT_EQ(Velmorctl({"cam", "trust", LOOPBACK, "--yes"}, WithoutRoot()).exitCode, 77);
 }

@@ -53,7 +53,10 @@ std::string Time(const ASN1_TIME* time) {
 Certificate Certificate::FromPem(const std::string& text, const std::string& source) {
   std::unique_ptr<BIO, int (*)(BIO*)> memory(BIO_new_mem_buf(text.data(), static_cast<int>(text.size())),
                                              BIO_free);
-  X509* certificate = memory ? PEM_read_bio_X509(memory.get(), nullptr, nullptr, nullptr) : nullptr;
+  // The empty pass phrase keeps OpenSSL from asking for one at the terminal when the text claims to be
+  // encrypted.
+  char noPassPhrase[] = "";
+  X509* certificate = memory ? PEM_read_bio_X509(memory.get(), nullptr, nullptr, noPassPhrase) : nullptr;
   ERR_clear_error();
   if (certificate == nullptr) {
     throw Failure(ExitCode::Proxy, "'" + source + "' holds no certificate in PEM form")
