@@ -1,15 +1,13 @@
 #include "service.h"
 
 #include <arpa/inet.h>
-#include <rapidjson/document.h>
-#include <rapidjson/stringbuffer.h>
-#include <rapidjson/writer.h>
 
 #include <algorithm>
 #include <string_view>
 #include <thread>
 
 #include "failure.h"
+#include "json_memory.h"
 
 namespace camproxy {
 
@@ -32,21 +30,21 @@ bool IsVisible(char character) {
 
 /// The body of an answer, parsed where it lies: its strings point into `body`, so that nothing of it is
 /// copied into memory that nobody wipes. Null when the body is not JSON.
-rapidjson::Document ParseInPlace(SecretString& body) {
-  rapidjson::Document json;
+JsonDocument ParseInPlace(SecretString& body) {
+  JsonDocument json;
   json.ParseInsitu<rapidjson::kParseIterativeFlag | rapidjson::kParseValidateEncodingFlag>(body.data());
   if (json.HasParseError()) json.SetNull();
   return json;
 }
 
-std::optional<std::string_view> FindText(const rapidjson::Value& object, const char* name) {
+std::optional<std::string_view> FindText(const JsonDocument::ValueType& object, const char* name) {
   const auto field = object.FindMember(name);
   if (field == object.MemberEnd() || !field->value.IsString()) return std::nullopt;
   return std::string_view(field->value.GetString(), field->value.GetStringLength());
 }
 
 /// A field of an answer that goes on into files and directory requests: visible ASCII and no blank.
-SecretString ReadText(const rapidjson::Document& answer, const char* name) {
+SecretString ReadText(const JsonDocument& answer, const char* name) {
   if (!answer.IsObject()) ThrowInvalidAnswer("is no JSON object");
   const auto text = FindText(answer, name);
   if (!text) ThrowInvalidAnswer(std::string("has no text '") + name + "'");
@@ -57,7 +55,7 @@ SecretString ReadText(const rapidjson::Document& answer, const char* name) {
 }
 
 /// What the service says to a person, fit for one line of a log.
-std::string ForLog(const rapidjson::Document& failure) {
+std::string ForLog(const JsonDocument& failure) {
   const auto text = FindText(failure, "text");
   if (!text) return "no reason given";
   std::string line(text->substr(0, LONGEST_LOGGED_TEXT));
@@ -80,16 +78,13 @@ std::string ForLog(const rapidjson::Document& failure) {
                 "it refused with status " + number + " (" + httpStatus + "): " + ForLog(failure));
 }
 
-using JsonWriter = rapidjson::Writer<rapidjson::StringBuffer, rapidjson::UTF8<>, rapidjson::UTF8<>,
-                                     rapidjson::CrtAllocator, rapidjson::kWriteValidateEncodingFlag>;
-
 void WriteField(JsonWriter& writer, const char* name, const char* value) {
   writer.Key(name);
   if (!writer.String(value)) throw Failure(INVALID_PARAMETER, std::string("the '") + name + "' is not UTF-8");
 }
 
 SecretString DescribeComputer(const char* hostName, const char* container) {
-  rapidjson::StringBuffer text;
+  JsonText text;
   JsonWriter writer(text);
   writer.StartObject();
   WriteField(writer, "hostName", hostName);
