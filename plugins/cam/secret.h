@@ -17,7 +17,7 @@ class WipingAllocator {
 
   WipingAllocator() = default;
   template <class Other>
-  WipingAllocator(const WipingAllocator<Other>&) noexcept {}  // NOLINT(google-explicit-constructor): allocators convert: rebinds
+  WipingAllocator(const WipingAllocator<Other>&) noexcept {}  // NOLINT(google-explicit-constructor): rebinds
 
   T* allocate(std::size_t count) { return std::allocator<T>().allocate(count); }
   void deallocate(T* memory, std::size_t count) noexcept {
