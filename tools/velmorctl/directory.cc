@@ -1,6 +1,6 @@
-#include <CLI/App.hpp>
-
 #include "directory.h"
+
+#include <CLI/App.hpp>
 
 #include "authentication/active_directory_config_store.h"
 #include "failure.h"

@@ -3,8 +3,8 @@
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <unistd.h>
-#include <CLI/App.hpp>
 
+#include <CLI/App.hpp>
 #include <cerrno>
 #include <cstring>
 #include <string_view>
