@@ -1,10 +1,9 @@
 #include "helper/netapi.h"
 
-#include <netapi.h>
-
 #include <cstring>
 
 #include "common/status.h"
+#include "velmor/netapi_code.h"
 
 namespace sambaprovider::netapi {
 namespace {
@@ -40,17 +39,17 @@ uint32_t StatusOf(uint32_t code) {
 libnetapi_ctx* Context() {
   static libnetapi_ctx* const context = [] {
     libnetapi_ctx* made = nullptr;
-    const NET_API_STATUS status = libnetapi_init(&made);
+    const uint32_t status = velmor::CodeOf(libnetapi_init(&made));
     if (status != 0) throw Failure(kInternalError, "libnetapi does not start: " + std::to_string(status));
     return made;
   }();
   return context;
 }
 
-void Check(NET_API_STATUS result, const char* action) {
-  if (result == 0) return;
-  const auto code = static_cast<uint32_t>(result);
-  const char* reason = libnetapi_get_error_string(Context(), result);
+void Check(const NET_API_STATUS& status, const char* action) {
+  const uint32_t code = velmor::CodeOf(status);
+  if (code == 0) return;
+  const char* reason = libnetapi_get_error_string(Context(), static_cast<NET_API_STATUS>(code));
   throw Failure(StatusOf(code), std::string(action) + ": " + (reason == nullptr ? "" : reason) + " (code " +
                                     std::to_string(code) + ")");
 }
@@ -64,7 +63,7 @@ NET_API_STATUS RemoveSecrets() {
 // A removal that did not reach the disk counts as a success. Only a host that has nothing left to remove is
 // told that it is not joined.
 void RequireSecretsAreGone() {
-  if (static_cast<uint32_t>(RemoveSecrets()) == kNotJoined) return;
+  if (velmor::CodeOf(RemoveSecrets()) == kNotJoined) return;
   throw Failure(kInternalError, "the machine's secrets could not be removed");
 }
 
@@ -98,10 +97,10 @@ void StoreSecrets(const velmor::Secret& blob) {
     *to = byte;
     to += 2;
   }
-  const NET_API_STATUS result =
+  const NET_API_STATUS status =
       NetRequestOfflineDomainJoin(reinterpret_cast<uint8_t*>(wide.Data()), static_cast<uint32_t>(wide.Size()),
                                   NETSETUP_PROVISION_ONLINE_CALLER, nullptr);
-  if (static_cast<uint32_t>(result) != kMustRestart) Check(result, "storing the machine's secrets");
+  if (velmor::CodeOf(status) != kMustRestart) Check(status, "storing the machine's secrets");
 }
 
 void Unjoin(const std::string& user, const velmor::Secret& password) {

@@ -6,15 +6,13 @@
 // for the default place), "takeOver" (whether an existing account may be used); the secret is the user's
 // password. The answer's secret is the join text.
 #include <cstdint>
-// The header of libnetapi uses the fixed-width types without including them.
-#include <netapi.h>
-
 #include <cstring>
 #include <string>
 
 #include "common/message.h"
 #include "common/status.h"
 #include "provision/private_configuration.h"
+#include "velmor/netapi_code.h"
 
 namespace camd {
 namespace {
@@ -62,7 +60,7 @@ Message Provision(const Message& request) {
   const std::string controller = request.Text("controller");
   const uint32_t options = request.fields.value("takeOver", false) ? kReuseAccount : 0;
   const char* text = nullptr;
-  const auto status = static_cast<uint32_t>(NetProvisionComputerAccount(
+  const uint32_t status = velmor::CodeOf(NetProvisionComputerAccount(
       request.Text("domain").c_str(), request.Text("computer").c_str(), NullWhenEmpty(container),
       NullWhenEmpty(controller), options, nullptr, nullptr, &text));
   if (status != kSuccess) throw session.FailureOf(status);
