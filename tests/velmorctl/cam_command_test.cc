@@ -410,7 +410,8 @@ TEST_P(CamStatusTest, OfTheServiceEndsWithTheCodeOfTheProxy) {
 INSTANTIATE_TEST_SUITE_P(Each, CamStatusTest,
                          ::testing::Values(5U, 13U, 31U, 50U, 59U, 87U, 170U, 267U, 1061U, 1067U, 1069U,
                                            1210U, 1311U, 1326U, 1359U, 1398U, 1460U, 1816U, 2224U, 2691U,
-                                           10054U));
+                                           10054U),
+                         ::testing::PrintToStringParamName());
 
 }  // namespace
 
