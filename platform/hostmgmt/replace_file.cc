@@ -15,11 +15,12 @@
 #include "system/file_descriptor.h"
 #include "system/resolve_links.h"
 #include "system/system_error.h"
+#include "velmor/unique_fd.h"
 
 namespace HostMgmt {
 namespace {
 
-using System::FileDescriptor;
+using velmor::UniqueFd;
 
 [[noreturn]] void ThrowWriteError(const std::string& path, int errorNumber) {
   System::ThrowFileError("write", path, errorNumber);
@@ -75,7 +76,7 @@ class TemporaryFile {
 
   const Target& target_;
   std::string name_;
-  FileDescriptor file_;
+  UniqueFd file_;
   int creationError_;
   bool placed_ = false;
 };
@@ -145,7 +146,7 @@ bool OverwriteWith(int descriptor, const std::string& content) {
 
 /// Puts the old content back when the new one does not fit.
 void WriteInPlace(const Target& target, const std::string& content) {
-  const FileDescriptor file(
+  const UniqueFd file(
       openat(target.folder, target.name.c_str(), O_RDWR | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
   if (!file.IsOpen()) ThrowWriteError(target.path, errno);
   std::string oldContent;
@@ -161,15 +162,14 @@ void WriteInPlace(const Target& target, const std::string& content) {
 }
 
 /// The file as it is, for reading; not open when there is none yet.
-FileDescriptor OpenOld(const Target& target) {
+UniqueFd OpenOld(const Target& target) {
   struct stat status {};
   if (fstatat(target.folder, target.name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
-    if (errno == ENOENT) return FileDescriptor(-1);
+    if (errno == ENOENT) return UniqueFd();
     ThrowWriteError(target.path, errno);
   }
   if (!S_ISREG(status.st_mode)) System::ThrowFileError("write", target.path, "it is not a regular file");
-  FileDescriptor file(
-      openat(target.folder, target.name.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
+  UniqueFd file(openat(target.folder, target.name.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK));
   if (!file.IsOpen()) ThrowWriteError(target.path, errno);
   return file;
 }
@@ -178,7 +178,7 @@ FileDescriptor OpenOld(const Target& target) {
 
 void ReplaceFile(const std::string& path, const std::string& content, mode_t modeWhenNew) {
   const std::string target = System::ResolveLinks(path);
-  const FileDescriptor folder(open(System::DirectoryOf(target).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  const UniqueFd folder(open(System::DirectoryOf(target).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
   if (!folder.IsOpen()) ThrowWriteError(target, errno);
   ReplaceFileIn(folder.Get(), target, content, {.mode = modeWhenNew});
 }
@@ -186,7 +186,7 @@ void ReplaceFile(const std::string& path, const std::string& content, mode_t mod
 void ReplaceFileIn(int folder, const std::string& path, const std::string& content,
                    const NewFileAttributes& whenNew) {
   const Target target(folder, path);
-  const FileDescriptor old = OpenOld(target);
+  const UniqueFd old = OpenOld(target);
 
   TemporaryFile temporary(target);
   // A writable file may be mounted into a directory that cannot be written.

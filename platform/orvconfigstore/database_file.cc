@@ -16,12 +16,13 @@
 #include "system/file_descriptor.h"
 #include "system/make_directory.h"
 #include "system/system_error.h"
+#include "velmor/unique_fd.h"
 
 namespace OrvConfigStore {
 namespace {
 
 using HostMgmt::System::ErrorText;
-using HostMgmt::System::FileDescriptor;
+using velmor::UniqueFd;
 
 constexpr char kDirectory[] = "/var/lib/quenix";
 constexpr char kJournalPath[] = "/var/lib/quenix/configstore.db-journal";
@@ -80,7 +81,7 @@ class ScratchFile {
  public:
   ScratchFile() : path_(std::string(kDatabasePath) + ".XXXXXX") {
     const std::string content = EmptyDatabase();
-    const FileDescriptor file(mkostemp(path_.data(), O_CLOEXEC));
+    const UniqueFd file(mkostemp(path_.data(), O_CLOEXEC));
     if (!file.IsOpen()) ThrowCreationError(errno);
     if (!HostMgmt::System::WriteAll(file.Get(), content) || fchmod(file.Get(), 0644) != 0 ||
         fsync(file.Get()) != 0) {

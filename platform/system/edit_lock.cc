@@ -26,11 +26,11 @@ std::string LockPath(const std::string& name) {
   return std::string(kLockDirectory) + "/" + name + ".lock";
 }
 
-FileDescriptor OpenLockFile(const std::string& lockPath, const std::string& editedPath) {
+velmor::UniqueFd OpenLockFile(const std::string& lockPath, const std::string& editedPath) {
   if (mkdir(kLockDirectory, 0755) != 0 && errno != EEXIST) {
     ThrowLockError(editedPath, lockPath, ErrorText(errno));
   }
-  FileDescriptor file(open(lockPath.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
+  velmor::UniqueFd file(open(lockPath.c_str(), O_RDWR | O_CREAT | O_CLOEXEC | O_NOFOLLOW, 0600));
   if (!file.IsOpen()) ThrowLockError(editedPath, lockPath, ErrorText(errno));
   return file;
 }

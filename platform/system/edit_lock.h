@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "system/file_descriptor.h"
+#include "velmor/unique_fd.h"
 
 namespace HostMgmt::System {
 
@@ -17,7 +17,7 @@ class EditLock {
   EditLock(const std::string& name, const std::string& editedPath);
 
  private:
-  FileDescriptor file_;
+  velmor::UniqueFd file_;
 };
 
 }  // namespace HostMgmt::System

@@ -5,26 +5,10 @@
 
 #include <cerrno>
 #include <cstddef>
-#include <utility>
+
+#include "velmor/unique_fd.h"
 
 namespace HostMgmt::System {
-
-FileDescriptor::FileDescriptor(int descriptor) : descriptor_(descriptor) {}
-
-FileDescriptor::~FileDescriptor() {
-  if (IsOpen()) close(descriptor_);
-}
-
-FileDescriptor::FileDescriptor(FileDescriptor&& other) noexcept
-    : descriptor_(std::exchange(other.descriptor_, -1)) {}
-
-bool FileDescriptor::IsOpen() const {
-  return descriptor_ >= 0;
-}
-
-int FileDescriptor::Get() const {
-  return descriptor_;
-}
 
 bool WriteAll(int descriptor, const std::string& content) {
   std::size_t done = 0;
@@ -49,7 +33,7 @@ bool ReadAll(int descriptor, std::string* content) {
 }
 
 bool SyncDirectory(const std::string& path) {
-  const FileDescriptor directory(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+  const velmor::UniqueFd directory(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
   return directory.IsOpen() && fsync(directory.Get()) == 0;
 }
 

@@ -5,23 +5,6 @@
 
 namespace HostMgmt::System {
 
-/// Owns an open file descriptor and closes it.
-class FileDescriptor {
- public:
-  /// Takes over `descriptor`; -1 stands for none.
-  explicit FileDescriptor(int descriptor);
-  ~FileDescriptor();
-  FileDescriptor(FileDescriptor&& other) noexcept;
-  FileDescriptor(const FileDescriptor&) = delete;
-  FileDescriptor& operator=(const FileDescriptor&) = delete;
-
-  bool IsOpen() const;
-  int Get() const;
-
- private:
-  int descriptor_;
-};
-
 /// Writes all bytes at the descriptor's position. Returns false with errno set when that fails.
 bool WriteAll(int descriptor, const std::string& content);
 

@@ -7,12 +7,13 @@
 
 #include "system/file_descriptor.h"
 #include "system/system_error.h"
+#include "velmor/unique_fd.h"
 
 namespace HostMgmt::System {
 
 std::optional<std::string> ReadFile(const std::string& path) {
   // Without O_NONBLOCK, a FIFO in the file's place would hold the caller for ever.
-  const FileDescriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+  const velmor::UniqueFd file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
   if (!file.IsOpen() && errno == ENOENT) return std::nullopt;
   if (!file.IsOpen()) ThrowFileError("read", path, errno);
   struct stat status {};

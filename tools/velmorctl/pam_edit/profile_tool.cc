@@ -1,9 +1,9 @@
 #include "pam_edit/profile_tool.h"
 
 #include "failure.h"
-#include "pam_edit/run_program.h"
 #include "pam_edit/scratch_folder.h"
 #include "text.h"
+#include "velmor/run_program.h"
 
 namespace velmorctl::pam {
 
@@ -47,17 +47,20 @@ std::string LastWords(const ScratchFolder& scratch) {
 void Run(const ScratchFolder& scratch, const std::vector<std::string>& arguments) {
   std::vector<std::string> command = {program, "--root", scratch.Path() + copyFolder};
   command.insert(command.end(), arguments.begin(), arguments.end());
-  ProgramRun run = RunProgram(command, Environment(scratch.Path()), scratch.Path() + outputFile);
-  if (!run.started) {
+  const velmor::ProgramEnd end = velmor::RunProgram({.arguments = command,
+                                                     .environment = Environment(scratch.Path()),
+                                                     .output = scratch.Path() + outputFile,
+                                                     .longestRun = std::chrono::minutes(1)});
+  if (end.startError != 0) {
     throw Failure(ExitCode::HostNotReady, "the files are kept by pam-auth-update, which cannot be run")
         .Detail("file", program)
-        .Detail("reason", run.ending)
+        .Detail("reason", SystemErrorText(end.startError))
         .Try("install the package libpam-runtime, or keep the files by hand");
   }
-  if (!run.ending.empty()) {
+  if (!end.failure.empty()) {
     std::string words = LastWords(scratch);
     throw Failure(ExitCode::HostNotReady, "pam-auth-update cannot change the files")
-        .Detail("reason", words.empty() ? run.ending : run.ending + ": " + Printable(words))
+        .Detail("reason", words.empty() ? end.failure : end.failure + ": " + Printable(words))
         .Try("see what \"pam-auth-update\" says when it is run by hand");
   }
 }
