@@ -1,10 +1,11 @@
-/// The status codes that this provider gives out, and the exception that carries one inside it.
+/// The status codes that this provider gives out, and what an operation came to.
 #ifndef SAMBA_COMMON_STATUS_H
 #define SAMBA_COMMON_STATUS_H
 
 #include <cstdint>
-#include <stdexcept>
 #include <string>
+
+#include "velmor/failure.h"
 
 namespace sambaprovider {
 
@@ -40,16 +41,7 @@ enum Status : uint32_t {
   kTimedOut = 10060,
 };
 
-/// A step that did not work. `what()` is one line for the record of attempts and never holds a secret.
-class Failure : public std::runtime_error {
- public:
-  Failure(uint32_t status, const std::string& text) : std::runtime_error(text), status_(status) {}
-
-  uint32_t Code() const { return status_; }
-
- private:
-  uint32_t status_;
-};
+using velmor::Failure;
 
 /// What an operation came to.
 struct Outcome {

@@ -25,6 +25,7 @@
 #include "common/status.h"
 #include "precheck/directory.h"
 #include "precheck/kerberos.h"
+#include "velmor/kerberos.h"
 
 namespace sambaprovider {
 namespace {
@@ -79,7 +80,7 @@ class Precheck {
   void CheckPassword() {
     NextStep("password", controller_ + " answers");
     const std::string realm = UpperCase(request_.Text("dnsDomain"));
-    DirectKerberosTo(realm, controller_);
+    velmor::DirectKerberosTo(realm, controller_);
     try {
       LogOn(realm, SplitAccountName(request_.Text("user")), request_.secret);
     } catch (const Failure& failure) {
@@ -146,7 +147,7 @@ class Precheck {
   std::string step_ = "connect";
   std::vector<std::pair<std::string, std::string>> done_;
   std::unique_ptr<Directory> directory_;
-  RootEntry root_;
+  velmor::RootEntry root_;
   std::string controller_;
   int64_t offset_ = 0;
 };

@@ -3,8 +3,9 @@
 #define CAMD_COMMON_STATUS_H
 
 #include <cstdint>
-#include <stdexcept>
 #include <string>
+
+#include "velmor/failure.h"
 
 namespace camd {
 
@@ -32,16 +33,7 @@ enum Status : uint32_t {
   kAccountInUse = 2404,
 };
 
-// A step that did not work. `what()` is one line for the log and never holds a secret.
-class Failure : public std::runtime_error {
- public:
-  Failure(uint32_t status, const std::string& text) : std::runtime_error(text), status_(status) {}
-
-  uint32_t Code() const { return status_; }
-
- private:
-  uint32_t status_;
-};
+using velmor::Failure;
 
 // The system's text for an error number. Safe on any thread.
 std::string ErrorText(int errorNumber);

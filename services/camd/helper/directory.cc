@@ -1,52 +1,13 @@
 #include "helper/directory.h"
 
-#include <sasl/sasl.h>
-
 #include <charconv>
 #include <cstdlib>
-#include <ctime>
-#include <memory>
 #include <sstream>
-#include <utility>
 
 #include "common/status.h"
 
 namespace camd {
 namespace {
-
-struct MessageRelease {
-  void operator()(LDAPMessage* message) const { ldap_msgfree(message); }
-};
-using Message = std::unique_ptr<LDAPMessage, MessageRelease>;
-
-uint32_t StatusOf(int error) {
-  switch (error) {
-    case LDAP_SERVER_DOWN:
-    case LDAP_TIMEOUT:
-    case LDAP_CONNECT_ERROR:
-    case LDAP_UNAVAILABLE:
-    case LDAP_BUSY:
-      return kNoLogonServers;
-    case LDAP_INSUFFICIENT_ACCESS:
-      return kAccessDenied;
-    case LDAP_INVALID_DN_SYNTAX:
-    case LDAP_NAMING_VIOLATION:
-    case LDAP_REFERRAL:
-      return kInvalidContainer;
-    default:
-      return kInternalError;
-  }
-}
-
-void Check(LDAP* connection, int error, const char* action) {
-  if (error == LDAP_SUCCESS) return;
-  char* detail = nullptr;
-  ldap_get_option(connection, LDAP_OPT_DIAGNOSTIC_MESSAGE, &detail);
-  std::string text = std::string("the controller ") + action + ": " + ldap_err2string(error);
-  if (detail != nullptr && *detail != '\0') text += std::string(" (") + detail + ")";
-  ldap_memfree(detail);
-  throw Failure(StatusOf(error), text);
-}
 
 // Makes a search show the owner in a security descriptor. Without it the controller would be asked for the
 // audit entries too, which few may see, and would show nothing.
@@ -66,52 +27,10 @@ class OwnerOnly {
   LDAPControl* controls_[2] = {&control_, nullptr};
 };
 
-// Searches; nothing when the base does not exist.
-Message Search(LDAP* connection, const std::string& base, int scope, const std::string& filter,
-               std::vector<std::string> attributes) {
-  std::vector<char*> names;
-  for (std::string& attribute : attributes) names.push_back(attribute.data());
-  names.push_back(nullptr);
-  LDAPMessage* found = nullptr;
-  OwnerOnly ownerOnly;
-  const int error = ldap_search_ext_s(connection, base.c_str(), scope, filter.c_str(), names.data(), 0,
-                                      ownerOnly.Controls(), nullptr, nullptr, 0, &found);
-  Message message(found);
-  if (error == LDAP_NO_SUCH_OBJECT) return nullptr;
-  Check(connection, error, "refused a search");
-  return message;
-}
-
-LDAPMessage* FirstEntry(LDAP* connection, const Message& message) {
-  return message == nullptr ? nullptr : ldap_first_entry(connection, message.get());
-}
-
-std::string Value(LDAP* connection, LDAPMessage* entry, const char* attribute) {
-  berval** values = ldap_get_values_len(connection, entry, attribute);
-  if (values == nullptr) return "";
-  const std::string value = values[0] == nullptr ? "" : std::string(values[0]->bv_val, values[0]->bv_len);
-  ldap_value_free_len(values);
-  return value;
-}
-
-int64_t NumberValue(LDAP* connection, LDAPMessage* entry, const char* attribute) {
-  const std::string text = Value(connection, entry, attribute);
+int64_t NumberOf(const std::string& text) {
   int64_t number = 0;
   std::from_chars(text.data(), text.data() + text.size(), number);
   return number;
-}
-
-int64_t TimeValue(LDAP* connection, LDAPMessage* entry, const char* attribute) {
-  tm parts = {};
-  const std::string text = Value(connection, entry, attribute);
-  return strptime(text.c_str(), "%Y%m%d%H%M%S", &parts) == nullptr ? 0 : timegm(&parts);
-}
-
-std::string NameOf(LDAP* connection, LDAPMessage* entry) {
-  char* dn = ldap_get_dn(connection, entry);
-  const std::string name = dn == nullptr ? "" : dn;
-  ldap_memfree(dn);
-  return name;
 }
 
 // A text as a value in a filter.
@@ -123,15 +42,6 @@ std::string ForFilter(std::string text) {
   std::string result(escaped.bv_val, escaped.bv_len);
   if (escaped.bv_val != plain.bv_val) ldap_memfree(escaped.bv_val);
   return result;
-}
-
-// GSSAPI asks for nothing: the ticket says who we are.
-int AnswerNothing(LDAP* /*connection*/, unsigned int /*flags*/, void* /*defaults*/, void* interaction) {
-  for (auto* prompt = static_cast<sasl_interact_t*>(interaction); prompt->id != SASL_CB_LIST_END; ++prompt) {
-    prompt->result = "";
-    prompt->len = 0;
-  }
-  return LDAP_SUCCESS;
 }
 
 }  // namespace
@@ -179,90 +89,36 @@ std::string OwnerText(const std::string& descriptor) {
   return size > descriptor.size() - begin ? "" : SidText(descriptor.substr(begin, size));
 }
 
-Directory::Directory(const std::string& controller, std::chrono::seconds timeout) {
-  const std::string uri = "ldap://" + controller;
-  const int error = ldap_initialize(&connection_, uri.c_str());
-  if (error != LDAP_SUCCESS) throw Failure(kInternalError, uri + ": " + ldap_err2string(error));
-  const int version = LDAP_VERSION3;
-  const timeval limit = {timeout.count(), 0};
-  ldap_set_option(connection_, LDAP_OPT_PROTOCOL_VERSION, &version);
-  ldap_set_option(connection_, LDAP_OPT_NETWORK_TIMEOUT, &limit);
-  ldap_set_option(connection_, LDAP_OPT_TIMEOUT, &limit);
-  ldap_set_option(connection_, LDAP_OPT_REFERRALS, LDAP_OPT_OFF);
-  // The name in the ticket is the one we asked for, not what a reverse look-up makes of the address.
-  ldap_set_option(connection_, LDAP_OPT_X_SASL_NOCANON, LDAP_OPT_ON);
+std::string Directory::DomainSid(const velmor::RootEntry& root) {
+  const auto entry = Find(root.baseDn, LDAP_SCOPE_BASE, "(objectClass=*)", {"objectSid"});
+  if (!entry) throw Failure(kInternalError, "the directory does not show the domain's own entry");
+  return SidText(entry->Value("objectSid"));
 }
 
-Directory::Directory(Directory&& other) noexcept : connection_(std::exchange(other.connection_, nullptr)) {}
-
-Directory::~Directory() {
-  if (connection_ != nullptr) ldap_unbind_ext_s(connection_, nullptr, nullptr);
+std::string Directory::UserSid(const velmor::RootEntry& root, const std::string& user) {
+  const auto entry =
+      Find(root.baseDn, LDAP_SCOPE_SUBTREE, "(sAMAccountName=" + ForFilter(user) + ")", {"objectSid"});
+  return entry ? SidText(entry->Value("objectSid")) : "";
 }
 
-RootEntry Directory::ReadRootEntry() {
-  const Message message = Search(connection_, "", LDAP_SCOPE_BASE, "(objectClass=*)",
-                                 {"dnsHostName", "defaultNamingContext", "configurationNamingContext"});
-  LDAPMessage* entry = FirstEntry(connection_, message);
-  if (entry == nullptr) throw Failure(kNoLogonServers, "the controller does not answer as a directory");
-  return {Value(connection_, entry, "dnsHostName"), Value(connection_, entry, "defaultNamingContext"),
-          Value(connection_, entry, "configurationNamingContext")};
-}
-
-void Directory::Bind() {
-  Check(connection_,
-        ldap_sasl_interactive_bind_s(connection_, nullptr, "GSSAPI", nullptr, nullptr, LDAP_SASL_QUIET,
-                                     AnswerNothing, nullptr),
-        "refused the log-on");
-}
-
-std::string Directory::NetbiosName(const RootEntry& root) {
-  const Message message = Search(connection_, "CN=Partitions," + root.configurationDn, LDAP_SCOPE_ONELEVEL,
-                                 "(&(nETBIOSName=*)(nCName=" + root.baseDn + "))", {"nETBIOSName"});
-  LDAPMessage* entry = FirstEntry(connection_, message);
-  if (entry == nullptr)
-    throw Failure(kInternalError, "the directory does not name the domain's NetBIOS name");
-  return Value(connection_, entry, "nETBIOSName");
-}
-
-std::string Directory::DomainSid(const RootEntry& root) {
-  const Message message = Search(connection_, root.baseDn, LDAP_SCOPE_BASE, "(objectClass=*)", {"objectSid"});
-  LDAPMessage* entry = FirstEntry(connection_, message);
-  if (entry == nullptr) throw Failure(kInternalError, "the directory does not show the domain's own entry");
-  return SidText(Value(connection_, entry, "objectSid"));
-}
-
-std::string Directory::UserSid(const RootEntry& root, const std::string& user) {
-  const Message message = Search(connection_, root.baseDn, LDAP_SCOPE_SUBTREE,
-                                 "(sAMAccountName=" + ForFilter(user) + ")", {"objectSid"});
-  LDAPMessage* entry = FirstEntry(connection_, message);
-  return entry == nullptr ? "" : SidText(Value(connection_, entry, "objectSid"));
-}
-
-std::optional<ComputerAccount> Directory::FindComputer(const RootEntry& root, const std::string& computer) {
-  const Message message =
-      Search(connection_, root.baseDn, LDAP_SCOPE_SUBTREE, "(sAMAccountName=" + computer + "$)",
-             {"objectSid", "pwdLastSet", "lastLogon", "logonCount", "whenCreated", "nTSecurityDescriptor"});
-  LDAPMessage* entry = FirstEntry(connection_, message);
-  if (entry == nullptr) return std::nullopt;
+std::optional<ComputerAccount> Directory::FindComputer(const velmor::RootEntry& root,
+                                                       const std::string& computer) {
+  OwnerOnly ownerOnly;
+  const auto entry =
+      Find(root.baseDn, LDAP_SCOPE_SUBTREE, "(sAMAccountName=" + computer + "$)",
+           {"objectSid", "pwdLastSet", "lastLogon", "logonCount", "whenCreated", "nTSecurityDescriptor"},
+           ownerOnly.Controls());
+  if (!entry) return std::nullopt;
+  const std::string created = entry->Value("whenCreated");
   ComputerAccount account;
-  account.dn = NameOf(connection_, entry);
-  account.sid = SidText(Value(connection_, entry, "objectSid"));
-  account.passwordSet = NumberValue(connection_, entry, "pwdLastSet");
-  account.lastLogon = NumberValue(connection_, entry, "lastLogon");
-  account.logonCount = NumberValue(connection_, entry, "logonCount");
-  account.created = TimeValue(connection_, entry, "whenCreated");
-  account.owner = OwnerText(Value(connection_, entry, "nTSecurityDescriptor"));
+  account.dn = entry->dn;
+  account.sid = SidText(entry->Value("objectSid"));
+  account.passwordSet = NumberOf(entry->Value("pwdLastSet"));
+  account.lastLogon = NumberOf(entry->Value("lastLogon"));
+  account.logonCount = NumberOf(entry->Value("logonCount"));
+  account.created = created.empty() ? 0 : velmor::ParseGeneralizedTime(created);
+  account.owner = OwnerText(entry->Value("nTSecurityDescriptor"));
   return account;
-}
-
-bool Directory::Exists(const std::string& dn) {
-  const Message message = Search(connection_, dn, LDAP_SCOPE_BASE, "(objectClass=*)", {"objectClass"});
-  return FirstEntry(connection_, message) != nullptr;
-}
-
-void Directory::Delete(const std::string& dn) {
-  Check(connection_, ldap_delete_ext_s(connection_, dn.c_str(), nullptr, nullptr),
-        "refused to delete the account");
 }
 
 }  // namespace camd

@@ -1,23 +1,15 @@
-// Questions to one domain controller through LDAP.
+// What the service asks of a domain controller.
 #ifndef CAMD_HELPER_DIRECTORY_H
 #define CAMD_HELPER_DIRECTORY_H
 
-#include <ldap.h>
-
-#include <chrono>
 #include <cstdint>
 #include <optional>
 #include <string>
 #include <vector>
 
-namespace camd {
+#include "velmor/directory_connection.h"
 
-// What a controller tells anybody.
-struct RootEntry {
-  std::string controller;
-  std::string baseDn;
-  std::string configurationDn;
-};
+namespace camd {
 
 struct ComputerAccount {
   std::string dn;
@@ -40,33 +32,15 @@ std::string SidText(const std::string& bytes);
 // The same of the owner that a security descriptor names; empty when it names none.
 std::string OwnerText(const std::string& descriptor);
 
-// A connection to one controller. Every operation waits for at most the time-out of the constructor and
-// throws Failure: kNoLogonServers when the controller does not answer, kAccessDenied, kInvalidContainer,
-// kInternalError. Not for use by several threads at once.
-class Directory {
+class Directory : public velmor::DirectoryConnection {
  public:
-  Directory(const std::string& controller, std::chrono::seconds timeout);
-  Directory(Directory&& other) noexcept;
-  Directory(const Directory&) = delete;
-  Directory& operator=(const Directory&) = delete;
-  ~Directory();
+  using DirectoryConnection::DirectoryConnection;
 
-  // Needs no log-on.
-  RootEntry ReadRootEntry();
-  // Authenticates with the ticket that LogOn left and encrypts what follows.
-  void Bind();
-
-  std::string NetbiosName(const RootEntry& root);
-  std::string DomainSid(const RootEntry& root);
+  std::string DomainSid(const velmor::RootEntry& root);
   // The identifier of the user with this name; empty when there is none.
-  std::string UserSid(const RootEntry& root, const std::string& user);
+  std::string UserSid(const velmor::RootEntry& root, const std::string& user);
   // The account with this name, which is a valid computer name.
-  std::optional<ComputerAccount> FindComputer(const RootEntry& root, const std::string& computer);
-  bool Exists(const std::string& dn);
-  void Delete(const std::string& dn);
-
- private:
-  LDAP* connection_ = nullptr;
+  std::optional<ComputerAccount> FindComputer(const velmor::RootEntry& root, const std::string& computer);
 };
 
 }  // namespace camd

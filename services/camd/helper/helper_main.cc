@@ -24,6 +24,7 @@
 #include "helper/container.h"
 #include "helper/directory.h"
 #include "helper/kerberos.h"
+#include "velmor/kerberos.h"
 
 namespace camd {
 namespace {
@@ -51,14 +52,14 @@ int64_t FileTimeOf(int64_t secondsSince1970) {
 // A controller that has answered and to which we have logged on.
 struct Connection {
   Directory directory;
-  RootEntry root;
+  velmor::RootEntry root;
 };
 
 Connection Connect(const Message& request) {
   const std::string domain = request.Text("domain");
   const std::string realm = UpperCase(domain);
   const std::string wanted = request.Text("controller");
-  PrepareKerberos(realm, wanted);
+  velmor::DirectKerberosTo(realm, wanted);
   LogOn(realm, request.Text("user"), request.secret);
   const std::vector<std::string> controllers =
       wanted.empty() ? ControllersOf(domain) : std::vector<std::string>{wanted};
@@ -68,7 +69,7 @@ Connection Connect(const Message& request) {
       directory.ReadRootEntry();
       directory.Bind();
       // Once more: what it said before it showed who it is decides nothing.
-      const RootEntry root = directory.ReadRootEntry();
+      const velmor::RootEntry root = directory.ReadRootEntry();
       return {std::move(directory), root};
     } catch (const Failure& failure) {
       if (failure.Code() != kNoLogonServers) throw;
@@ -119,7 +120,7 @@ Message Provision(const Message& request, Connection& connection, const std::str
   order.fields = {{"domain", request.Text("domain")},
                   {"realm", UpperCase(request.Text("domain"))},
                   {"netbiosDomain", connection.directory.NetbiosName(connection.root)},
-                  {"controller", connection.root.controller},
+                  {"controller", connection.root.controllerDnsName},
                   {"user", request.Text("user")},
                   {"computer", request.Text("computer")},
                   {"container", container},
@@ -164,9 +165,9 @@ bool IsUnused(const Message& request, Connection& connection) {
   for (const std::string& controller : ControllersOf(request.Text("domain"))) {
     Directory directory(controller, kControllerTimeout);
     directory.Bind();
-    const RootEntry root = directory.ReadRootEntry();
+    const velmor::RootEntry root = directory.ReadRootEntry();
     const auto account = directory.FindComputer(root, computer);
-    const bool isRecorder = UpperCase(root.controller) == UpperCase(recorder);
+    const bool isRecorder = UpperCase(root.controllerDnsName) == UpperCase(recorder);
     if (account && !LooksUntouched(*account, request, ourSid, isRecorder)) return false;
     recorderAsked = recorderAsked || isRecorder;
   }
@@ -205,7 +206,7 @@ Message Create(const Message& request) {
   answer.fields = {{"accountName", computer + "$"},
                    {"dn", made.dn},
                    {"sid", made.sid},
-                   {"recordedBy", connection.root.controller},
+                   {"recordedBy", connection.root.controllerDnsName},
                    {"passwordSet", made.passwordSet},
                    {"lastLogon", made.lastLogon},
                    {"logonCount", made.logonCount}};

@@ -1,0 +1,69 @@
+/// Questions to one domain controller through LDAP.
+#ifndef VELMOR_DIRECTORY_CONNECTION_H
+#define VELMOR_DIRECTORY_CONNECTION_H
+
+#include <ldap.h>
+
+#include <chrono>
+#include <cstdint>
+#include <map>
+#include <optional>
+#include <string>
+#include <vector>
+
+namespace velmor {
+
+/// What a controller tells anybody.
+struct RootEntry {
+  std::string controllerDnsName;
+  std::string baseDn;
+  std::string configurationDn;
+  int64_t currentTime = 0;  /// seconds since 1970
+};
+
+struct DirectoryEntry {
+  std::string dn;
+  std::map<std::string, std::string> values;  /// the first value of each attribute
+
+  /// Empty when the entry has no such attribute, or does not show it to us.
+  std::string Value(const std::string& attribute) const;
+};
+
+/// Parses LDAP's "20261121010203.0Z" to seconds since 1970. Throws Failure (1359).
+int64_t ParseGeneralizedTime(const std::string& text);
+
+/// A connection to one controller, a name or an address. Every operation waits for at most the time-out of
+/// the constructor and throws Failure: 1311 when the controller does not answer, 5 when it grants no access,
+/// 267 for what cannot be a name, else 1359. Not for use by several threads at once.
+class DirectoryConnection {
+ public:
+  DirectoryConnection(const std::string& controller, std::chrono::seconds timeout);
+  DirectoryConnection(DirectoryConnection&& other) noexcept;
+  DirectoryConnection(const DirectoryConnection&) = delete;
+  DirectoryConnection& operator=(const DirectoryConnection&) = delete;
+  ~DirectoryConnection();
+
+  /// Needs no log-on.
+  RootEntry ReadRootEntry();
+
+  /// Authenticates with the ticket that LogOn left and encrypts what follows.
+  void Bind();
+
+  std::string NetbiosName(const RootEntry& root);
+  bool Exists(const std::string& dn);
+  void Delete(const std::string& dn);
+
+ protected:
+  /// The first entry that the filter matches, with these attributes; nothing when there is none or when the
+  /// base does not exist. The list of controls, when there is one, ends with null.
+  std::optional<DirectoryEntry> Find(const std::string& base, int scope, const std::string& filter,
+                                     const std::vector<std::string>& attributes,
+                                     LDAPControl** controls = nullptr);
+
+ private:
+  LDAP* connection_ = nullptr;
+};
+
+}  // namespace velmor
+
+#endif  // VELMOR_DIRECTORY_CONNECTION_H
