@@ -86,10 +86,9 @@ std::string DirectoryEntry::Value(const std::string& attribute) const {
   return found == values.end() ? "" : found->second;
 }
 
-int64_t ParseGeneralizedTime(const std::string& text) {
+std::optional<int64_t> ParseGeneralizedTime(const std::string& text) {
   tm parts = {};
-  if (strptime(text.c_str(), "%Y%m%d%H%M%S", &parts) == nullptr)
-    throw Failure(kInternalError, "the controller's time is not understood: '" + text + "'");
+  if (strptime(text.c_str(), "%Y%m%d%H%M%S", &parts) == nullptr) return std::nullopt;
   return timegm(&parts);
 }
 
@@ -120,7 +119,7 @@ RootEntry DirectoryConnection::ReadRootEntry() {
            {"dnsHostName", "defaultNamingContext", "configurationNamingContext", "currentTime"});
   if (!entry) throw Failure(kNoLogonServers, "the controller does not answer as a directory");
   return {entry->Value("dnsHostName"), entry->Value("defaultNamingContext"),
-          entry->Value("configurationNamingContext"), ParseGeneralizedTime(entry->Value("currentTime"))};
+          entry->Value("configurationNamingContext"), entry->Value("currentTime")};
 }
 
 void DirectoryConnection::Bind() {

@@ -18,7 +18,7 @@ struct RootEntry {
   std::string controllerDnsName;
   std::string baseDn;
   std::string configurationDn;
-  int64_t currentTime = 0;  /// seconds since 1970
+  std::string currentTime;  /// for ParseGeneralizedTime
 };
 
 struct DirectoryEntry {
@@ -29,8 +29,8 @@ struct DirectoryEntry {
   std::string Value(const std::string& attribute) const;
 };
 
-/// Parses LDAP's "20261121010203.0Z" to seconds since 1970. Throws Failure (1359).
-int64_t ParseGeneralizedTime(const std::string& text);
+/// LDAP's "20261121010203.0Z" in seconds since 1970; nothing for another text.
+std::optional<int64_t> ParseGeneralizedTime(const std::string& text);
 
 /// A connection to one controller, a name or an address. Every operation waits for at most the time-out of
 /// the constructor and throws Failure: 1311 when the controller does not answer, 5 when it grants no access,

@@ -4,12 +4,12 @@
 
 #include "support/machine.h"
 
-// AddressSanitizer is clang's in the presets, ThreadSanitizer g++'s: each has its own way to tell.
+// g++ says with macros what is watched, clang with this.
 #ifndef __has_feature
 #define __has_feature(name) 0
 #endif
 
-#if __has_feature(address_sanitizer)
+#if defined(__SANITIZE_ADDRESS__) || __has_feature(address_sanitizer)
 // Two plug-ins in one process define the same two symbols: that is their interface.
 extern "C" __attribute__((visibility("default"))) const char* __asan_default_options();
 const char* __asan_default_options() {

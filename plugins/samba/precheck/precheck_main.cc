@@ -62,7 +62,7 @@ class Precheck {
         root_ = directory_->ReadRootEntry();
         RequireDomain();
         controller_ = root_.controllerDnsName.empty() ? controllers[index] : root_.controllerDnsName;
-        offset_ = root_.currentTime - time(nullptr);
+        offset_ = ControllersTime() - time(nullptr);
         return;
       } catch (const Failure& failure) {
         reasons += "; " + controllers[index] + ": " + failure.what();
@@ -75,6 +75,11 @@ class Precheck {
   void RequireDomain() const {
     if (EqualWithoutCase(root_.baseDn, DomainDn(request_.Text("dnsDomain")))) return;
     throw Failure(kNoLogonServers, "serves another domain, " + root_.baseDn);
+  }
+
+  int64_t ControllersTime() const {
+    if (const auto seconds = velmor::ParseGeneralizedTime(root_.currentTime)) return *seconds;
+    throw Failure(kInternalError, "the controller's time is not understood: '" + root_.currentTime + "'");
   }
 
   void CheckPassword() {

@@ -109,14 +109,13 @@ std::optional<ComputerAccount> Directory::FindComputer(const velmor::RootEntry& 
            {"objectSid", "pwdLastSet", "lastLogon", "logonCount", "whenCreated", "nTSecurityDescriptor"},
            ownerOnly.Controls());
   if (!entry) return std::nullopt;
-  const std::string created = entry->Value("whenCreated");
   ComputerAccount account;
   account.dn = entry->dn;
   account.sid = SidText(entry->Value("objectSid"));
   account.passwordSet = NumberOf(entry->Value("pwdLastSet"));
   account.lastLogon = NumberOf(entry->Value("lastLogon"));
   account.logonCount = NumberOf(entry->Value("logonCount"));
-  account.created = created.empty() ? 0 : velmor::ParseGeneralizedTime(created);
+  account.created = velmor::ParseGeneralizedTime(entry->Value("whenCreated")).value_or(0);
   account.owner = OwnerText(entry->Value("nTSecurityDescriptor"));
   return account;
 }

@@ -8,9 +8,10 @@
 
 namespace camd {
 
-// Gets a ticket for `user` in `realm` and keeps it where GSSAPI finds it until the process ends. Blocks as
-// long as the Kerberos library does, some seconds per controller. Throws Failure: kServiceLogonFailed when
-// the user is refused, kNoLogonServers when no controller answers, kTimeSkew when the clocks differ too much.
+// Asks once for a ticket for `user` in `realm` and keeps it where GSSAPI finds it until the process ends.
+// Blocks as long as the Kerberos library does, some seconds per controller. Throws Failure:
+// kServiceLogonFailed when the user is refused, kNoLogonServers when no controller answers, kTimeSkew when
+// the clocks differ too much.
 void LogOn(const std::string& realm, const std::string& user, const Secret& password);
 
 }  // namespace camd

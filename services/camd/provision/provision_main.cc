@@ -23,7 +23,7 @@ constexpr uint32_t kReuseAccount = NETSETUP_PROVISION_REUSE_ACCOUNT;
 class Session {
  public:
   Session() {
-    if (libnetapi_init(&context_) != 0)
+    if (velmor::CodeOf(libnetapi_init(&context_)) != 0)
       throw Failure(kInternalError, "libnetapi cannot be used on this host");
   }
   Session(const Session&) = delete;
@@ -31,8 +31,8 @@ class Session {
   ~Session() { libnetapi_free(context_); }
 
   void LogOnAs(const std::string& user, const Secret& password) {
-    if (libnetapi_set_username(context_, user.c_str()) != 0 ||
-        libnetapi_set_password(context_, password.Text()) != 0) {
+    if (velmor::CodeOf(libnetapi_set_username(context_, user.c_str())) != 0 ||
+        velmor::CodeOf(libnetapi_set_password(context_, password.Text())) != 0) {
       throw Failure(kNotEnoughMemory, "not enough memory");
     }
   }
