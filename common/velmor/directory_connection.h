@@ -49,8 +49,13 @@ class DirectoryConnection {
   /// Authenticates with the ticket that LogOn left and encrypts what follows.
   void Bind();
 
+  /// The NetBIOS name of the controller's domain.
   std::string NetbiosName(const RootEntry& root);
+
+  /// Whether there is an entry with this name that we may see.
   bool Exists(const std::string& dn);
+
+  /// Deletes a computer account.
   void Delete(const std::string& dn);
 
  protected:

@@ -17,6 +17,7 @@ struct ComputerAccount {
 /// Whether these flags, in decimal digits as LDAP gives them, are those of a domain controller's account.
 bool IsControllersAccount(const std::string& userAccountControl);
 
+/// Its operation throws Failure as those of the connection do.
 class Directory : public velmor::DirectoryConnection {
  public:
   using DirectoryConnection::DirectoryConnection;

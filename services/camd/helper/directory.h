@@ -32,6 +32,7 @@ std::string SidText(const std::string& bytes);
 // The same of the owner that a security descriptor names; empty when it names none.
 std::string OwnerText(const std::string& descriptor);
 
+// Its operations throw Failure as those of the connection do.
 class Directory : public velmor::DirectoryConnection {
  public:
   using DirectoryConnection::DirectoryConnection;
